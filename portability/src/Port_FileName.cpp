@@ -1,0 +1,1 @@
+#include "Port_FileName.h"

@@ -1,0 +1,5 @@
+#include "Tesu_IPUpdateInfo.h"
+
+#include "Port_Init.h"
+
+TESU_MODULE_PORTABILITY_INIT("Tesu_IPUpdateInfo")

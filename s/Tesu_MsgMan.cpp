@@ -1,0 +1,84 @@
+#include "Tesu_MsgMan.h"
+
+#include <iostream>
+
+#include "Port_Init.h"
+#include "Port_Msg.h"
+
+TESU_MODULE_PORTABILITY_INIT("Tesu_MsgMan")
+
+namespace Tesu {
+
+namespace {
+
+// Calls `visit` on every registered manager, in the dispatcher's order.
+template <typename Visit>
+void forEachRegisteredManager(Visit visit) {
+    Port_MsgManList managers = Port_MsgDispatcher::getAllMsgMans();
+    for (Port_MsgManListIterator it = managers.begin(); it != managers.end(); it++) {
+        visit(*it);
+    }
+}
+
+}  // namespace
+
+MsgMan::MsgMan() : MsgMan(DIAG_STANDARD) {}
+
+MsgMan::MsgMan(const DiagnosticLevel& level) : msgStream(nullptr), diagnosticLevel(level) {
+    // If anything below throws, msgStream is destroyed as a member and nothing is registered.
+    msgStream.addMsgStream(std::cerr);
+    switch (diagnosticLevel) {
+        case DIAG_SILENT:
+            msgStream.disableMsgType(std::cerr, PORT_MSG_ERROR);
+            msgStream.disableMsgType(std::cerr, PORT_MSG_WARNING);
+            msgStream.disableMsgType(std::cerr, PORT_MSG_DETAIL);
+            msgStream.disableMsgType(std::cerr, PORT_MSG_FATAL);
+            msgStream.disableMsgType(std::cerr, PORT_MSG_STATUS);
+            break;
+        case DIAG_REDUCED:
+            msgStream.enableMsgType(std::cerr, PORT_MSG_ERROR);
+            msgStream.enableMsgType(std::cerr, PORT_MSG_WARNING);
+            msgStream.disableMsgType(std::cerr, PORT_MSG_DETAIL);
+            msgStream.enableMsgType(std::cerr, PORT_MSG_FATAL);
+            msgStream.disableMsgType(std::cerr, PORT_MSG_STATUS);
+            break;
+        case DIAG_FULL:
+            msgStream.enableMsgType(std::cerr, PORT_MSG_ERROR);
+            msgStream.enableMsgType(std::cerr, PORT_MSG_WARNING);
+            msgStream.enableMsgType(std::cerr, PORT_MSG_DETAIL);
+            msgStream.enableMsgType(std::cerr, PORT_MSG_FATAL);
+            msgStream.enableMsgType(std::cerr, PORT_MSG_STATUS);
+            break;
+        case DIAG_STANDARD:
+        default:
+            msgStream.enableMsgType(std::cerr, PORT_MSG_ERROR);
+            msgStream.enableMsgType(std::cerr, PORT_MSG_WARNING);
+            msgStream.disableMsgType(std::cerr, PORT_MSG_DETAIL);
+            msgStream.enableMsgType(std::cerr, PORT_MSG_FATAL);
+            msgStream.enableMsgType(std::cerr, PORT_MSG_STATUS);
+            msgStream.enableMsgType(std::cerr, PORT_MSG_INFO);
+            break;
+    }
+    forEachRegisteredManager([](Port_MsgMan* manager) { manager->deactivate(); });
+    Port_MsgDispatcher::addMsgMan(&msgStream);
+}
+
+MsgMan::~MsgMan() {
+    Port_MsgDispatcher::removeMsgMan(&msgStream);
+    forEachRegisteredManager([](Port_MsgMan* manager) { manager->activate(); });
+}
+
+void MsgMan::addMsgStream(std::ostream& stream) {
+    msgStream.addMsgStream(stream);
+}
+void MsgMan::addMsgStream(Port::Stream& stream) {
+    msgStream.addMsgStream(stream);
+}
+void MsgMan::removeMsgStream(std::ostream& stream) {
+    msgStream.removeMsgStream(stream);
+}
+void MsgMan::removeMsgStream(Port::Stream& stream) {
+    msgStream.removeMsgStream(stream);
+}
+
+}  // namespace Tesu

@@ -1,0 +1,55 @@
+// Tesu::MsgMan: has every message dispatched in the process written to std::cerr, filtered
+// by a diagnostic level, and to further streams, for as long as the object lives.
+#ifndef TESU_MSGMAN_H
+#define TESU_MSGMAN_H
+
+#include <cstdint>
+#include <iosfwd>
+
+#include "Port_Msg.h"
+#include "Tesu_Export.h"
+
+namespace Port {
+class Stream;
+}
+
+namespace Tesu {
+
+// Construction adds std::cerr to its message stream with the switches of the diagnostic
+// level, calls deactivate() on every manager already registered, then registers its message
+// stream; destruction unregisters it and calls activate() on every manager still registered.
+// The level governs std::cerr only; a stream added later gets the message stream's defaults
+// (every type on). The object belongs to whoever made it; it is neither copied nor moved.
+class TESU_API MsgMan {
+  public:
+    enum DiagnosticLevel : std::int32_t {
+        DIAG_SILENT = 0,    // nothing to std::cerr (types 0, 1, 2, 4, 7 off)
+        DIAG_REDUCED = 1,   // errors, warnings, fatal errors (0, 1, 4 on; 2, 7 off)
+        DIAG_STANDARD = 2,  // and status and info messages (0, 1, 4, 7, 8 on; 2 off)
+        DIAG_FULL = 3,      // and details (0, 1, 2, 4, 7 on)
+    };
+
+    // Level DIAG_STANDARD.
+    MsgMan();
+    // The referenced level, read once; any value other than 0, 1 and 3 acts as DIAG_STANDARD.
+    explicit MsgMan(const DiagnosticLevel& level);
+    ~MsgMan();
+    MsgMan(const MsgMan&) = delete;
+    MsgMan& operator=(const MsgMan&) = delete;
+
+    // Forward to the message stream: a stream added twice, or removed without having been
+    // added, is the message stream's business. The streams stay the caller's; remove one
+    // before destroying it.
+    void addMsgStream(std::ostream& stream);
+    void addMsgStream(Port::Stream& stream);
+    void removeMsgStream(std::ostream& stream);
+    void removeMsgStream(Port::Stream& stream);
+
+  private:
+    Port_MsgStream msgStream;
+    DiagnosticLevel diagnosticLevel;
+};
+
+}  // namespace Tesu
+
+#endif

@@ -1,0 +1,5 @@
+#include "Tesu_SetWorkingDirectory.h"
+
+#include "Port_Init.h"
+
+TESU_MODULE_PORTABILITY_INIT("Tesu_SetWorkingDirectory")

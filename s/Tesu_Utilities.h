@@ -1,0 +1,103 @@
+// Tesu::Utilities: path texts, installation search, identity and versions, checksummed
+// files and file lists. Every operation is static, runs on the caller's thread and keeps no
+// state; every text, vector and file name returned belongs to the caller.
+#ifndef TESU_UTILITIES_H
+#define TESU_UTILITIES_H
+
+#include <vector>
+
+#include "Port_FileName.h"
+#include "Port_String.h"
+#include "Tesu_Export.h"
+
+namespace Tesu {
+
+class TESU_API Utilities {
+  public:
+    Utilities() = delete;
+
+    // ---- Path texts ----------------------------------------------------------------------
+    // "/" and "\" both count as trailing separators on every platform; a separator added is
+    // the platform's. These ask the file system only whether a name is an existing regular
+    // file or directory, and issue nothing.
+
+    // True when `path` ends in "/" or "\"; false for the empty text.
+    static bool IsTerminatedWithPathSeparator(const Port::StringBase<char>& path);
+    // `path` with one platform separator appended, unless it is empty, already ends in a
+    // separator, or names an existing regular file.
+    static Port::StringBase<char> TerminateWithPathSeparator(const Port::StringBase<char>& path);
+    // The absolute, normalised form of `path`, ending in a separator when it is an existing
+    // directory; empty for the empty text.
+    static Port::StringBase<char> GetAbsolutePath(const Port::StringBase<char>& path);
+    // The absolute directory that `path` denotes, ending in a separator: the directory itself,
+    // or for a file or a name that does not exist, its parent.
+    static Port::StringBase<char> GetAbsoluteDirectory(const Port::StringBase<char>& path);
+    // `path` relative to the directory of `base` ("./" and the rest, "./" alone for the base
+    // itself) when its absolute text begins with that directory's; otherwise its absolute
+    // text. Empty for an empty `path`. Never produces "..".
+    static Port::StringBase<char> MakeRelativePath(const Port::StringBase<char>& base,
+                                                   const Port::StringBase<char>& path);
+
+    // ---- Installation search -------------------------------------------------------------
+    // Each returns true and sets the output to the absolute path of the first match, in the
+    // order of the installation roots (Port::QuarnelPath); false leaves the output untouched.
+    // A match may be a file or a directory. Traces at verbose level on the logger "utilities".
+
+    // Looks for `relativeName` directly under each root.
+    static bool GetFullQuarnelPathOf(const Port::StringBase<char>& relativeName,
+                                     Port::StringBase<char>& fullPath);
+    // Looks for `relativeName` inside each subdirectory (in name order) of the IP container
+    // "tessel/ip/quarnel" under each root.
+    static bool GetFullQuarnelPathWithContainer(const Port::StringBase<char>& relativeName,
+                                                Port::StringBase<char>& fullPath);
+    // Finds the shipped Java runtime: <sep>java<sep><platform><sep>jre<sep>bin<sep>java (with
+    // ".exe" on Windows) under the roots.
+    static bool GetJavaExecutablePath(Port::StringBase<char>& javaPath);
+
+    // ---- Identity and versions -----------------------------------------------------------
+    // "Quarnel Tessel".
+    static Port::StringBase<char> ApplicationName();
+    // The layer's version value "version", unchanged.
+    static Port::StringBase<char> RevisionVersion();
+    // This library's build date, "Mmm dd yyyy" (day padded with a blank), and build time,
+    // "hh:mm:ss". Static texts; never freed by the caller.
+    static const char* GetBuildDate();
+    static const char* GetBuildTime();
+    // The major part of the version value plus one, followed by ".1" ("9.2.0" gives "10.1"; an
+    // empty major gives "1.1"; a major that is not a number is kept: "x.2" gives "x.1"). Empty
+    // when the version cannot be split; traces the reason at verbose level on "utilities".
+    static Port::StringBase<char> NextMajorRelease();
+
+    // ---- Checksummed files ---------------------------------------------------------------
+    // A checksummed file carries "# CRC:", one skipped character and eight characters: the
+    // "%8x" text of the CRC-32 of its lines that hold no "#", joined without separators.
+
+    // Sets `checksum` to the eight-character checksum text of `text` (lines separated by
+    // "\n"). Returns 0.
+    static unsigned int CalculateChecksum(const Port::StringBase<char>& text,
+                                          Port::StringBase<char>& checksum);
+    // Checks the file `fileName` against its own checksum line. Returns 0 when the file was
+    // read and closed, with `verdict` true when it holds no "# CRC:" or the stored text
+    // matches, false otherwise; returns 1 with `verdict` false when it cannot be opened
+    // (error "Could not open <name>") or closed (error "Could not close <name>"), naming the
+    // file as passed. Memory use does not grow with the file's size.
+    static unsigned int ValidateFileChecksum(const Port::StringBase<char>& fileName, bool& verdict);
+
+    // ---- File lists ----------------------------------------------------------------------
+    // A file list names one member per line, relative to the list's directory; "#" starts a
+    // comment, tabs count as blanks, blanks around a member are dropped, "/" and "\" are both
+    // separators (normalised to the platform's, runs collapsed). Missing members are left
+    // out with the warning "Missing file list member <absolute path>". An unreadable list gives
+    // the error "Cannot read <absolute path>", one that does not open "Cannot open <...>", and
+    // an empty result. Traces "Reading file list <absolute path>" at normal level on
+    // "utilities".
+
+    // The cleaned member texts of every existing member, in list order (repeats kept).
+    static std::vector<Port::StringBase<char>> GetFileListFileStrings(const Port::FileName& list);
+    // The same members as file names: the list's directory part followed by the member text.
+    static std::vector<Port::FileName> GetFileListFileNames(const Port::FileName& list);
+};
+
+}  // namespace Tesu
+
+#endif
