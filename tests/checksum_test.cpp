@@ -1,0 +1,222 @@
+// Checksummed files: the checksum text of a body of text, and the check of real files against
+// their own "# CRC:" line.
+#include <gtest/gtest.h>
+#include <unistd.h>
+
+#include <filesystem>
+#include <string>
+
+#include "Port_String.h"
+#include "TestSupport.h"
+#include "Tesu_Utilities.h"
+
+namespace {
+
+using Tesu::Utilities;
+
+std::string Sum(const std::string& text) {
+    Port::StringBase<char> checksum("stale text");
+    EXPECT_EQ(0u, Utilities::CalculateChecksum(Port::StringBase<char>(text), checksum));
+    return checksum.str();
+}
+
+struct Outcome {
+    unsigned int result;
+    bool verdict;
+    std::string messages;
+};
+
+// Validates `path` twice, once with the verdict starting true and once false, so that a
+// verdict left unwritten shows up as a difference between the two runs.
+Outcome Validate(const std::string& path) {
+    Outcome outcome{};
+    for (const bool initial : {true, false}) {
+        tesutest::MessageCapture capture;
+        bool verdict = initial;
+        const unsigned int result =
+            Utilities::ValidateFileChecksum(Port::StringBase<char>(path), verdict);
+        if (initial) {
+            outcome = Outcome{result, verdict, capture.text()};
+        } else {
+            EXPECT_EQ(outcome.result, result) << path;
+            EXPECT_EQ(outcome.verdict, verdict) << path;
+            EXPECT_EQ(outcome.messages, capture.text()) << path;
+        }
+    }
+    return outcome;
+}
+
+void ExpectValid(const tesutest::TempDir& dir, const std::string& content,
+                 const std::string& what) {
+    const Outcome outcome = Validate(dir.write("file.txt", content));
+    EXPECT_EQ(0u, outcome.result) << what;
+    EXPECT_TRUE(outcome.verdict) << what;
+    EXPECT_EQ("", outcome.messages) << what;
+}
+
+void ExpectInvalid(const tesutest::TempDir& dir, const std::string& content,
+                   const std::string& what) {
+    const Outcome outcome = Validate(dir.write("file.txt", content));
+    EXPECT_EQ(0u, outcome.result) << what;
+    EXPECT_FALSE(outcome.verdict) << what;
+    EXPECT_EQ("", outcome.messages) << what;
+}
+
+// The body used by most cases, and its checksum line as a writer stamps it.
+const std::string kBody = "module top;\n  wire a;\n\n  assign a = 1'b0;\nendmodule\n";
+std::string StampLine() {
+    return "# CRC: " + Sum(kBody) + "\n";
+}
+
+TEST(CalculateChecksum, GivesBlankPaddedLowerCaseHexOfTheCrc) {
+    EXPECT_EQ("cbf43926", Sum("123456789"));
+    EXPECT_EQ("       0", Sum(""));
+    // A CRC with five significant digits is padded with three blanks, never zeros.
+    EXPECT_EQ("   72fb8", Sum("line 2060"));
+    EXPECT_EQ("15e87871", Sum(std::string("a\0b", 3)));
+}
+
+TEST(CalculateChecksum, OnlyLinesWithoutHashCountAndLineBreaksDoNot) {
+    const std::string alphabeta = "281dec23";
+    EXPECT_EQ(alphabeta, Sum("alphabeta"));
+    EXPECT_EQ(alphabeta, Sum("alpha\nbeta"));
+    EXPECT_EQ(alphabeta, Sum("\nalpha\n\n\nbeta\n\n"));
+    EXPECT_EQ(alphabeta, Sum("# head\nalpha\nbe#ta\nbeta\n#"));
+    EXPECT_EQ(alphabeta, Sum("alpha\n# CRC: 00000000\nbeta"));
+    // Only "\n" separates lines; a carriage return is data.
+    EXPECT_EQ("e61c25ab", Sum("alpha\rbeta"));
+}
+
+TEST(ValidateFileChecksum, StampedFileStaysValidUnderHarmlessEdits) {
+    tesutest::TempDir dir;
+    const std::string stamp = StampLine();
+    ExpectValid(dir, stamp + kBody, "checksum line first");
+    ExpectValid(dir, kBody + stamp, "checksum line last");
+    ExpectValid(dir, "module top;\n  wire a;\n" + stamp + "\n  assign a = 1'b0;\nendmodule\n",
+                "checksum line moved between data lines");
+    ExpectValid(dir, stamp + "module top;  wire a;\n\n  assign a = 1'b0;endmodule\n",
+                "data lines joined");
+    ExpectValid(dir, stamp + "module \ntop;\n  wire a;\n\n  assign a\n = 1'b0;\nendmodule\n",
+                "data lines split");
+    ExpectValid(dir,
+                "# generated\n" + stamp + "module top;\n# a note\n  wire a;\n\n" +
+                    "  assign a = 1'b0;\n  # indented note\nendmodule\n",
+                "comments added");
+    ExpectValid(dir, "\n\n" + stamp + "\n" + kBody + "\n\n", "blank lines added");
+    ExpectValid(dir, kBody + stamp.substr(0, stamp.size() - 1), "no final line break");
+    ExpectValid(dir, "# Written by hand # CRC: " + Sum(kBody) + " and more\n" + kBody,
+                "marker inside a comment, text after the stored value ignored");
+    // The stored text is compared without regard to letter case.
+    ExpectValid(dir, "# CRC: 281DEC23\nalpha\nbeta\n", "upper-case stored value");
+    // Comments may be edited freely once stamped.
+    ExpectValid(dir, "# version 2\n" + stamp + kBody, "comment before the checksum edited");
+}
+
+TEST(ValidateFileChecksum, EditsThatChangeTheSumOrTheStoredTextAreCaught) {
+    tesutest::TempDir dir;
+    const std::string stamp = StampLine();
+    ExpectInvalid(dir, stamp + "module top;\n  wire b;\n\n  assign a = 1'b0;\nendmodule\n",
+                  "data character changed");
+    ExpectInvalid(dir, stamp + "module top;\n  wire a; #\n\n  assign a = 1'b0;\nendmodule\n",
+                  "hash inserted into a data line removes it from the sum");
+    ExpectInvalid(dir, stamp + kBody + "extra\n", "data line added");
+    ExpectInvalid(dir, stamp + "module top;\n  wire a;\n", "data lines removed");
+    // Zero padding where the checksum text pads with blanks.
+    ASSERT_EQ("   72fb8", Sum("line 2060"));
+    ExpectValid(dir, "# CRC:    72fb8\nline 2060\n", "blank padding");
+    ExpectInvalid(dir, "# CRC: 00072fb8\nline 2060\n", "zero padding");
+    // Without the separator the first digit is skipped and the line break is read.
+    ExpectInvalid(dir, "# CRC:" + Sum(kBody) + "\n" + kBody, "no separator character");
+    // The first marker counts, even inside an earlier comment.
+    ExpectInvalid(dir, "# notes: # CRC: is written below\n" + stamp + kBody,
+                  "earlier comment holding the marker");
+    // The marker is matched exactly: another letter case is no marker at all, so a file whose
+    // only such line is wrong is still accepted unchecked.
+    ExpectValid(dir, "# crc: ffffffff\n" + kBody, "lower-case marker");
+    ExpectValid(dir, "# no checksum here\n" + kBody, "no marker");
+}
+
+TEST(ValidateFileChecksum, StoredTextIsReadAcrossLineBreaks) {
+    tesutest::TempDir dir;
+    const std::string sum = Sum(kBody);
+    // The character after the colon is the line break itself; the value is on the next line
+    // (a comment, so it does not count).
+    ExpectValid(dir, kBody + "# CRC:\n" + sum + "#\n", "value on the line after the marker");
+    ExpectInvalid(dir, kBody + "# CRC: " + sum.substr(0, 4) + "\n" + sum.substr(4) + "#\n",
+                  "value broken over two lines");
+    ExpectInvalid(dir, kBody + "# CRC:\n\n" + sum + "#\n", "value two lines further");
+    // A checksum line at the very end that runs short never matches.
+    ExpectInvalid(dir, kBody + "# CRC: " + sum.substr(0, 7), "seven characters at the end");
+    ExpectInvalid(dir, kBody + "# CRC: " + sum.substr(0, 4) + "\n", "four characters");
+    ExpectInvalid(dir, kBody + "# CRC:", "marker ends the file");
+}
+
+TEST(ValidateFileChecksum, LineEndsAndBytesThatAreNotPlainText) {
+    tesutest::TempDir dir;
+    // CR-LF ends: the reader drops the "\r", so the file matches its LF text's sum.
+    ExpectValid(dir, "# CRC: 281dec23\r\nalpha\r\nbeta\r\n", "CR-LF line ends");
+    // A lone carriage return stays in its line.
+    ExpectValid(dir, "# CRC: e61c25ab\nalpha\rbeta\n", "carriage return inside a line");
+    ExpectInvalid(dir, "# CRC: 281dec23\nalpha\rbeta\n", "carriage return counted");
+    // NUL bytes are data like any other byte.
+    const std::string withNul("a\0b\n", 4);
+    ExpectValid(dir, "# CRC: 15e87871\n" + withNul, "NUL byte in a data line");
+    ExpectInvalid(dir, "# CRC: 15e87871\nab\n", "NUL byte left out");
+    ExpectInvalid(dir, "# CRC: 15e87871\n" + std::string("a\0c\n", 4), "NUL byte neighbour");
+
+    // A data line of several megabytes.
+    std::string longLine;
+    for (int i = 0; longLine.size() < 5u * 1024 * 1024; ++i) {
+        longLine += "word" + std::to_string(i) + ' ';
+    }
+    const std::string stamp = "# CRC: " + Sum(longLine) + "\n";
+    ExpectValid(dir, stamp + longLine + "\n", "long data line");
+    std::string changed = longLine;
+    changed[changed.size() / 2] = '!';
+    ExpectInvalid(dir, stamp + changed + "\n", "long data line changed in the middle");
+}
+
+TEST(ValidateFileChecksum, FilesWithNothingToSum) {
+    tesutest::TempDir dir;
+    ExpectValid(dir, "", "empty file");
+    ExpectValid(dir, "\n\n", "blank lines only");
+    // Only the checksum line: the stored value is the checksum text of nothing.
+    ExpectValid(dir, "# CRC:        0\n", "checksum line alone");
+    ExpectValid(dir, "# CRC:        0", "checksum line alone, no line break");
+    ExpectInvalid(dir, "# CRC: 00000000\n", "checksum line alone, zero padded");
+    ExpectInvalid(dir, "# CRC:        0\nx\n", "checksum of nothing over data");
+}
+
+TEST(ValidateFileChecksum, NamesThatDoNotOpenAreReportedAsPassed) {
+    tesutest::TempDir dir;
+    const std::string missing = dir.path() + "//sub/../missing%s%d.txt";
+    Outcome outcome = Validate(missing);
+    EXPECT_EQ(1u, outcome.result);
+    EXPECT_FALSE(outcome.verdict);
+    EXPECT_EQ("ERROR:tesutil - Could not open " + missing + "\n", outcome.messages);
+
+    const std::string directory = dir.mkdir("a directory");
+    outcome = Validate(directory);
+    EXPECT_EQ(1u, outcome.result);
+    EXPECT_FALSE(outcome.verdict);
+    EXPECT_EQ("ERROR:tesutil - Could not open " + directory + "\n", outcome.messages);
+
+    outcome = Validate("");
+    EXPECT_EQ(1u, outcome.result);
+    EXPECT_EQ("ERROR:tesutil - Could not open \n", outcome.messages);
+}
+
+TEST(ValidateFileChecksum, UnreadableFileDoesNotOpen) {
+    if (getuid() == 0) {
+        GTEST_SKIP() << "permissions do not stop the superuser";
+    }
+    tesutest::TempDir dir;
+    const std::string path = dir.write("locked.txt", StampLine() + kBody);
+    std::filesystem::permissions(path, std::filesystem::perms::none);
+    const Outcome outcome = Validate(path);
+    EXPECT_EQ(1u, outcome.result);
+    EXPECT_FALSE(outcome.verdict);
+    EXPECT_EQ("ERROR:tesutil - Could not open " + path + "\n", outcome.messages);
+}
+
+}  // namespace
