@@ -40,14 +40,242 @@ constexpr const char* kRevision = "$Revision: 1.37.14.1 $";
 
 // ==== Path texts =============================================================================
 // PATHS-BEGIN
+namespace {
+
+// The native text of `path`: its separators turned into the platform's.
+Port::StringBase<char> nativeText(const Port::StringBase<char>& path) {
+    return Port::FileName(path).MakeNative();
+}
+
+// The absolute, lexically normalised text of `path`; symbolic links are kept.
+Port::StringBase<char> absoluteText(const Port::StringBase<char>& path) {
+    return Port::FileName(path).GetAbsolutePath(false);
+}
+
+}  // namespace
+
+bool Utilities::IsTerminatedWithPathSeparator(const Port::StringBase<char>& path) {
+    if (path.IsEmpty()) {
+        return false;
+    }
+    const std::size_t last = path.GetLength() - 1;
+    return path.GetIndexOfLastChar('\\') == last || path.GetIndexOfLastChar('/') == last;
+}
+
+Port::StringBase<char> Utilities::TerminateWithPathSeparator(const Port::StringBase<char>& path) {
+    Port::StringBase<char> result(path);
+    if (path.IsEmpty() || IsTerminatedWithPathSeparator(path)) {
+        return result;
+    }
+    if (Port::File::isfile(nativeText(path))) {
+        return result;
+    }
+    // An existing directory, or a name that does not exist (or cannot be examined): the
+    // caller's own text gets the separator, not its native form.
+    result.Append(1, Port::FileName::GetPathSeparator());
+    return result;
+}
+
+Port::StringBase<char> Utilities::GetAbsolutePath(const Port::StringBase<char>& path) {
+    if (path.IsEmpty()) {
+        return Port::StringBase<char>();
+    }
+    Port::StringBase<char> native = nativeText(path);
+    const bool directory = Port::File::isdir(native);
+    if (directory) {
+        native = TerminateWithPathSeparator(native);
+    }
+    // The absolute form drops a trailing separator; a directory gets it back.
+    const Port::StringBase<char> absolute = absoluteText(absoluteText(native));
+    return directory ? TerminateWithPathSeparator(absolute) : absolute;
+}
+
+Port::StringBase<char> Utilities::GetAbsoluteDirectory(const Port::StringBase<char>& path) {
+    if (path.IsEmpty()) {
+        return Port::StringBase<char>();
+    }
+    Port::StringBase<char> native = nativeText(path);
+    const bool directory = Port::File::isdir(native);
+    if (directory) {
+        native = TerminateWithPathSeparator(native);
+    }
+    const Port::StringBase<char> absolute = absoluteText(native);
+    if (directory) {
+        return TerminateWithPathSeparator(absoluteText(absolute));
+    }
+    // A file, or a name that does not exist: its parent. The head ends in a separator, so a
+    // sibling whose name merely begins with this directory's name never counts as inside it.
+    return Port::FileName(absolute).GetHead(false, false);
+}
+
+Port::StringBase<char> Utilities::MakeRelativePath(const Port::StringBase<char>& base,
+                                                   const Port::StringBase<char>& path) {
+    const Port::StringBase<char> baseDirectory = GetAbsoluteDirectory(base);
+    if (path.IsEmpty()) {
+        return Port::StringBase<char>();
+    }
+    const Port::StringBase<char> absolute = GetAbsolutePath(path);
+    const std::size_t baseLength = baseDirectory.GetLength();
+    if (baseLength == 0 || absolute.str().compare(0, baseLength, baseDirectory.str()) != 0) {
+        return absolute;
+    }
+    // Only the leading copy of the base is replaced; the same text further on stays as it is.
+    Port::StringBase<char> relative(".");
+    relative.Append(1, Port::FileName::GetPathSeparator());
+    relative.Append(absolute.Extract(Port_Range{baseLength, Port::NPOS}));
+    return relative;
+}
 // PATHS-END
 
 // ==== Installation search ====================================================================
 // SEARCH-BEGIN
+namespace {
+
+// The IP container under an installation root; one text, with slashes on every platform.
+constexpr const char* kIpContainer = "tessel/ip/quarnel";
+
+// A candidate counts as present when it is a directory or a regular file.
+bool isPresent(const Port::FileName& candidate) {
+    return Port::File::isdir(candidate) || Port::File::isfile(candidate);
+}
+
+void traceFound(DebugMessenger* logger, const Port::StringBase<char>& relativeName,
+                const Port::StringBase<char>& fullPath) {
+    Port::StringBase<char> text;
+    text.Format("Looking for %s\nFound %s\n", relativeName.GetText(), fullPath.GetText());
+    logger->Verbose(text);
+}
+
+void traceMissing(DebugMessenger* logger, const Port::StringBase<char>& relativeName) {
+    Port::StringBase<char> text;
+    text.Format("Could not find %s\n", relativeName.GetText());
+    logger->Verbose(text);
+}
+
+}  // namespace
+
+bool Utilities::GetFullQuarnelPathOf(const Port::StringBase<char>& relativeName,
+                                     Port::StringBase<char>& fullPath) {
+    DebugMessenger* logger = DebugMessengerFactory::GetLogger("utilities");
+    const Port::PathList& roots = Port::QuarnelPath::GetInstance();
+    for (Port::PathListIterator root = roots.begin(); root != roots.end(); ++root) {
+        Port::FileName candidate;
+        candidate.SetHead(*root);
+        candidate.SetTail(relativeName);
+        if (isPresent(candidate)) {
+            fullPath = candidate.GetAbsolutePath(false);
+            traceFound(logger, relativeName, fullPath);
+            return true;
+        }
+    }
+    traceMissing(logger, relativeName);
+    return false;
+}
+
+bool Utilities::GetFullQuarnelPathWithContainer(const Port::StringBase<char>& relativeName,
+                                                Port::StringBase<char>& fullPath) {
+    DebugMessenger* logger = DebugMessengerFactory::GetLogger("utilities");
+    const Port::PathList& roots = Port::QuarnelPath::GetInstance();
+    for (Port::PathListIterator root = roots.begin(); root != roots.end(); ++root) {
+        Port::FileName container;
+        container.SetHead(*root);
+        container.PushPathEnd(kIpContainer);
+        if (!isPresent(container)) {
+            continue;
+        }
+        // Only the container's subdirectories are searched, never the container itself.
+        UT_DIR entries(container.GetAbsolutePath(false), UT_DIR::DIRECTORIES);
+        for (UT_DIR_ITERATOR entry = entries.begin(); entry != entries.end(); ++entry) {
+            Port::FileName candidate(container);
+            candidate.PushPathEnd(*entry);
+            candidate.SetTail(relativeName);
+            if (isPresent(candidate)) {
+                fullPath = candidate.GetAbsolutePath(false);
+                traceFound(logger, relativeName, fullPath);
+                entries.close();
+                return true;
+            }
+        }
+        entries.close();
+    }
+    traceMissing(logger, relativeName);
+    return false;
+}
+
+bool Utilities::GetJavaExecutablePath(Port::StringBase<char>& javaPath) {
+    const char separator = Port::FileName::GetPathSeparator();
+    Port::StringBase<char> relativeName;
+    relativeName.Append(1, separator).Append("java").Append(1, separator);
+    relativeName.Append(Port_Env::GetPlatformPath());
+    relativeName.Append(1, separator).Append("jre").Append(1, separator).Append("bin");
+    relativeName.Append(1, separator).Append("java");
+    if (Port_Env::IsNt()) {
+        relativeName.Append(".exe");
+    }
+    return GetFullQuarnelPathOf(relativeName, javaPath);
+}
 // SEARCH-END
 
 // ==== Identity and versions ==================================================================
 // IDENTITY-BEGIN
+namespace {
+
+// The compiler's stamps of this module's build: "Mmm dd yyyy" and "hh:mm:ss".
+constexpr char kBuildDate[] = __DATE__;
+constexpr char kBuildTime[] = __TIME__;
+
+}  // namespace
+
+Port::StringBase<char> Utilities::ApplicationName() {
+    return Port::StringBase<char>("Quarnel Tessel");
+}
+
+Port::StringBase<char> Utilities::RevisionVersion() {
+    return Port::Version::getValue("version");
+}
+
+const char* Utilities::GetBuildDate() {
+    return kBuildDate;
+}
+
+const char* Utilities::GetBuildTime() {
+    return kBuildTime;
+}
+
+Port::StringBase<char> Utilities::NextMajorRelease() {
+    DebugMessenger* logger = DebugMessengerFactory::GetLogger("utilities");
+    Port::StringBase<char> result;
+    const Port::StringBase<char> version = Port::Version::getValue("version");
+    Port::StringBase<char> major;
+    Port::StringBase<char> minor;
+    Port::StringBase<char> rest;
+    if (!Port::Version::splitVersion(version, major, minor, rest)) {
+        Port::StringBase<char> text;
+        text.Format("Failed to split extract major version from %s\n.", version.GetText());
+        logger->Verbose(text);
+        return result;
+    }
+    try {
+        Port::StringBase<char> next;
+        std::int32_t number = 0;
+        if (major.IsEmpty()) {
+            next = "1";
+        } else if (major.GetINT32(Port_Range{0, major.GetLength()}, number)) {
+            // Widened first, so that the largest major still has a successor.
+            next.Format("%lld", static_cast<long long>(number) + 1);
+        } else {
+            next = major;  // not a number: kept as it stands
+        }
+        next.Append(".1");
+        result = next;
+    } catch (...) {
+        result.Empty();
+        Port::StringBase<char> text;
+        text.Format("Unable to calculate the next major release after %s\n.", version.GetText());
+        logger->Verbose(text);
+    }
+    return result;
+}
 // IDENTITY-END
 
 // ==== Checksummed files ======================================================================

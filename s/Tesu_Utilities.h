@@ -19,7 +19,10 @@ class TESU_API Utilities {
     // ---- Path texts ----------------------------------------------------------------------
     // "/" and "\" both count as trailing separators on every platform; a separator added is
     // the platform's. These ask the file system only whether a name is an existing regular
-    // file or directory, and issue nothing.
+    // file or directory (symbolic links followed, never resolved in the text), and issue
+    // nothing. Absolute forms are lexical ("." and ".." resolved, repeated separators
+    // collapsed); a relative text is taken from the working directory, and when that cannot
+    // be read the layer's std::runtime_error passes to the caller.
 
     // True when `path` ends in "/" or "\"; false for the empty text.
     static bool IsTerminatedWithPathSeparator(const Port::StringBase<char>& path);
@@ -32,9 +35,12 @@ class TESU_API Utilities {
     // The absolute directory that `path` denotes, ending in a separator: the directory itself,
     // or for a file or a name that does not exist, its parent.
     static Port::StringBase<char> GetAbsoluteDirectory(const Port::StringBase<char>& path);
-    // `path` relative to the directory of `base` ("./" and the rest, "./" alone for the base
-    // itself) when its absolute text begins with that directory's; otherwise its absolute
-    // text. Empty for an empty `path`. Never produces "..".
+    // `path` relative to GetAbsoluteDirectory(base): when the absolute text of `path` begins
+    // with that directory's text (byte for byte), that leading part alone is replaced by "."
+    // and a platform separator ("./src/top.v"; "./" for the base itself); otherwise, and for
+    // an empty `base`, the absolute text of `path`. Since the directory ends in a separator,
+    // a sibling whose name merely begins with the base's name is not under it. Empty for an
+    // empty `path`. Never produces "..".
     static Port::StringBase<char> MakeRelativePath(const Port::StringBase<char>& base,
                                                    const Port::StringBase<char>& path);
 
@@ -43,11 +49,12 @@ class TESU_API Utilities {
     // order of the installation roots (Port::QuarnelPath); false leaves the output untouched.
     // A match may be a file or a directory. Traces at verbose level on the logger "utilities".
 
-    // Looks for `relativeName` directly under each root.
+    // Looks for `relativeName` directly under each root. An empty name finds the first root
+    // that exists as a directory.
     static bool GetFullQuarnelPathOf(const Port::StringBase<char>& relativeName,
                                      Port::StringBase<char>& fullPath);
     // Looks for `relativeName` inside each subdirectory (in name order) of the IP container
-    // "tessel/ip/quarnel" under each root.
+    // "tessel/ip/quarnel" under each root; never in the container itself or under a root.
     static bool GetFullQuarnelPathWithContainer(const Port::StringBase<char>& relativeName,
                                                 Port::StringBase<char>& fullPath);
     // Finds the shipped Java runtime: <sep>java<sep><platform><sep>jre<sep>bin<sep>java (with
@@ -64,8 +71,12 @@ class TESU_API Utilities {
     static const char* GetBuildDate();
     static const char* GetBuildTime();
     // The major part of the version value plus one, followed by ".1" ("9.2.0" gives "10.1"; an
-    // empty major gives "1.1"; a major that is not a number is kept: "x.2" gives "x.1"). Empty
-    // when the version cannot be split; traces the reason at verbose level on "utilities".
+    // empty major gives "1.1"; "2147483647.0" gives "2147483648.1"; a major that is not a
+    // 32-bit number is kept: "x.2" gives "x.1"). Empty when the version cannot be split
+    // (traced "Failed to split extract major version from <version>" and a full stop) or when
+    // the computing fails (traced "Unable to calculate the next major release after
+    // <version>" and a full stop); traces are at verbose level on "utilities". Exceptions of
+    // the version table itself pass to the caller.
     static Port::StringBase<char> NextMajorRelease();
 
     // ---- Checksummed files ---------------------------------------------------------------
