@@ -1,6 +1,7 @@
 #include "Tesu_MsgMan.h"
 
 #include <iostream>
+#include <vector>
 
 #include "Port_Init.h"
 #include "Port_Msg.h"
@@ -59,8 +60,27 @@ MsgMan::MsgMan(const DiagnosticLevel& level) : msgStream(nullptr), diagnosticLev
             msgStream.enableMsgType(std::cerr, PORT_MSG_INFO);
             break;
     }
-    forEachRegisteredManager([](Port_MsgMan* manager) { manager->deactivate(); });
-    Port_MsgDispatcher::addMsgMan(&msgStream);
+    // Deactivate the managers already registered, then register our own message stream last.
+    // Should either step throw, the managers deactivated so far are activated again before
+    // the exception passes on, so that a failed construction does not leave the process's
+    // other managers silent.
+    std::vector<Port_MsgMan*> deactivated;
+    try {
+        forEachRegisteredManager([&deactivated](Port_MsgMan* manager) {
+            deactivated.push_back(manager);
+            manager->deactivate();
+        });
+        Port_MsgDispatcher::addMsgMan(&msgStream);
+    } catch (...) {
+        for (Port_MsgMan* manager : deactivated) {
+            try {
+                manager->activate();
+            } catch (...) {
+                // Keep going: the first exception is the one the caller gets.
+            }
+        }
+        throw;
+    }
 }
 
 MsgMan::~MsgMan() {

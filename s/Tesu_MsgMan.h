@@ -18,15 +18,20 @@ namespace Tesu {
 // Construction adds std::cerr to its message stream with the switches of the diagnostic
 // level, calls deactivate() on every manager already registered, then registers its message
 // stream; destruction unregisters it and calls activate() on every manager still registered.
+// If construction fails (an exception from the layer), the exception passes to the caller,
+// nothing is registered, and the managers already deactivated are activated again.
 // The level governs std::cerr only; a stream added later gets the message stream's defaults
 // (every type on). The object belongs to whoever made it; it is neither copied nor moved.
 class TESU_API MsgMan {
   public:
+    // Switches set on std::cerr. A type code a level does not name keeps the message
+    // stream's setting for a new stream (on): so info messages (8) reach std::cerr at every
+    // level, and so does any code other than 0, 1, 2, 4, 7 and 8.
     enum DiagnosticLevel : std::int32_t {
-        DIAG_SILENT = 0,    // nothing to std::cerr (types 0, 1, 2, 4, 7 off)
+        DIAG_SILENT = 0,    // no errors, warnings, details, fatal or status (0, 1, 2, 4, 7 off)
         DIAG_REDUCED = 1,   // errors, warnings, fatal errors (0, 1, 4 on; 2, 7 off)
         DIAG_STANDARD = 2,  // and status and info messages (0, 1, 4, 7, 8 on; 2 off)
-        DIAG_FULL = 3,      // and details (0, 1, 2, 4, 7 on)
+        DIAG_FULL = 3,      // and details and status (0, 1, 2, 4, 7 on)
     };
 
     // Level DIAG_STANDARD.
