@@ -1,1 +1,331 @@
+// Port::File, Port::Stream and UT_DIR over the operating-system interface (Port_OS.h).
 #include "Port_File.h"
+
+#include <algorithm>
+#include <cstring>
+#include <stdexcept>
+#include <string>
+#include <utility>
+
+#include "Port_OS.h"
+
+namespace Port {
+
+namespace {
+
+// Reading uses one large buffer so that a line costs one memchr and one copy; files smaller
+// than that get a buffer of their own size (plus room to see the end).
+constexpr std::size_t kReadBufferSize = 256 * 1024;
+constexpr std::size_t kSmallestReadBuffer = 4 * 1024;
+constexpr std::size_t kWriteBufferSize = 64 * 1024;
+
+// The name as the system is to see it: both separators made the platform's. False for a
+// name that holds a NUL byte, since the system would see only its beginning and could act on
+// a different file.
+bool systemName(const StringBase<char>& name, std::string& result) {
+    const std::string& text = name.str();
+    if (text.find('\0') != std::string::npos) {
+        return false;
+    }
+    result = text;
+    for (char& c : result) {
+        if (FileName::IsSeparator(c)) {
+            c = os::kPathSeparator;
+        }
+    }
+    return true;
+}
+
+os::Kind kindOf(const StringBase<char>& name) {
+    std::string native;
+    return systemName(name, native) ? os::nameKind(native) : os::Kind::NONE;
+}
+
+}  // namespace
+
+struct Stream::Impl {
+    Impl(os::Handle h, StringBase<char> n, bool w, std::size_t size)
+        : handle(h), name(std::move(n)), writable(w), buffer(new char[size]), capacity(size) {}
+    Impl(const Impl&) = delete;
+    Impl& operator=(const Impl&) = delete;
+    ~Impl() {
+        if (handle != os::INVALID_HANDLE) {
+            os::closeFile(handle);
+        }
+    }
+
+    // Moves the unread bytes to the front of the buffer and reads more behind them. True when
+    // new bytes came; false at the end of the file or on a read error (both end reading).
+    bool fill() {
+        if (atEnd) {
+            return false;
+        }
+        if (begin > 0) {
+            std::memmove(buffer.get(), buffer.get() + begin, end - begin);
+            end -= begin;
+            begin = 0;
+        }
+        const std::int64_t count = os::readFile(handle, buffer.get() + end, capacity - end);
+        if (count > 0) {
+            end += static_cast<std::size_t>(count);
+            return true;
+        }
+        atEnd = true;
+        failed = count < 0;
+        return false;
+    }
+
+    // Writes the buffered bytes out. After a failure the stream refuses further writes: what
+    // reached the file is unknown.
+    bool writeOut() {
+        if (failed) {
+            return false;
+        }
+        if (end > 0) {
+            const bool ok = os::writeFile(handle, buffer.get(), end);
+            end = 0;
+            if (!ok) {
+                failed = true;
+                return false;
+            }
+        }
+        return true;
+    }
+
+    os::Handle handle;
+    StringBase<char> name;
+    bool writable;
+    std::unique_ptr<char[]> buffer;
+    std::size_t capacity;
+    std::size_t begin = 0;  // reading: first unread byte
+    std::size_t end = 0;    // reading: end of the bytes read; writing: bytes buffered
+    bool atEnd = false;     // reading: the system has nothing more to give
+    bool failed = false;    // a read or write failed
+};
+
+Stream::Stream(std::unique_ptr<Impl> impl) : impl_(std::move(impl)) {}
+Stream::~Stream() = default;
+
+std::int64_t Stream::readline(StringBase<char>& line) {
+    line.Empty();
+    if (impl_->writable) {
+        return -1;
+    }
+    Impl& s = *impl_;
+    bool gathered = false;
+    for (;;) {
+        if (s.begin == s.end && !s.fill()) {
+            break;
+        }
+        const char* start = s.buffer.get() + s.begin;
+        const std::size_t available = s.end - s.begin;
+        const void* found = std::memchr(start, '\n', available);
+        if (found != nullptr) {
+            std::size_t length = static_cast<std::size_t>(static_cast<const char*>(found) - start);
+            s.begin += length + 1;
+            if (length > 0 && start[length - 1] == '\r') {
+                --length;
+            }
+            line.Append(start, length);
+            return static_cast<std::int64_t>(line.GetLength());
+        }
+        gathered = true;
+        if (start[available - 1] == '\r') {
+            // Whether this "\r" ends the line depends on the next byte: keep it unread so that
+            // it meets that byte at the front of the buffer.
+            line.Append(start, available - 1);
+            s.begin = s.end - 1;
+            if (!s.fill()) {
+                // A lone "\r" at the end of the file is part of the last line.
+                line.Append(1, '\r');
+                s.begin = s.end;
+                break;
+            }
+        } else {
+            line.Append(start, available);
+            s.begin = s.end;
+        }
+    }
+    // The end of the file (or a read error) came before a line break: what was gathered is
+    // the last line.
+    return gathered ? static_cast<std::int64_t>(line.GetLength()) : -1;
+}
+
+bool Stream::geteof() {
+    if (impl_->writable) {
+        return true;
+    }
+    return impl_->begin == impl_->end && !impl_->fill();
+}
+
+bool Stream::write(const char* data, std::size_t length) {
+    Impl& s = *impl_;
+    if (!s.writable || s.failed) {
+        return false;
+    }
+    if (length == 0) {
+        return true;
+    }
+    if (length > s.capacity - s.end && !s.writeOut()) {
+        return false;
+    }
+    if (length >= s.capacity) {
+        // Larger than the buffer: straight to the file, after what was buffered before it.
+        if (!os::writeFile(s.handle, data, length)) {
+            s.failed = true;
+            return false;
+        }
+        return true;
+    }
+    std::memcpy(s.buffer.get() + s.end, data, length);
+    s.end += length;
+    return true;
+}
+
+bool Stream::flush() {
+    // A stream opened for reading has nothing to write out.
+    return !impl_->writable || impl_->writeOut();
+}
+
+bool Stream::writable() const {
+    return impl_->writable;
+}
+
+const StringBase<char>& Stream::name() const {
+    return impl_->name;
+}
+
+Stream* File::open(const StringBase<char>& name, int access, bool binary) {
+    os::OpenMode mode;
+    switch (access) {
+        case READ:
+            mode = os::OpenMode::READ;
+            break;
+        case WRITE:
+            mode = os::OpenMode::WRITE;
+            break;
+        case APPEND:
+            mode = os::OpenMode::APPEND;
+            break;
+        default:
+            return nullptr;
+    }
+    std::string native;
+    if (!systemName(name, native)) {
+        return nullptr;
+    }
+    const os::Handle handle = os::openFile(native, mode, binary);
+    if (handle == os::INVALID_HANDLE) {
+        return nullptr;
+    }
+    // Some systems open a directory for reading; it has no bytes to give as lines.
+    if (os::handleKind(handle) == os::Kind::DIRECTORY) {
+        os::closeFile(handle);
+        return nullptr;
+    }
+    std::size_t size = kWriteBufferSize;
+    if (mode == os::OpenMode::READ) {
+        size = kReadBufferSize;
+        const std::int64_t fileSize = os::handleSize(handle);
+        if (fileSize >= 0 && static_cast<std::uint64_t>(fileSize) < kReadBufferSize) {
+            size = std::max(kSmallestReadBuffer, static_cast<std::size_t>(fileSize) + 1);
+        }
+    }
+    // The Impl owns the handle from here, so that a failed allocation closes it.
+    std::unique_ptr<Stream::Impl> impl(
+        new Stream::Impl(handle, name, mode != os::OpenMode::READ, size));
+    return new Stream(std::move(impl));
+}
+
+bool File::close(Stream* stream) {
+    if (stream == nullptr) {
+        return false;
+    }
+    Stream::Impl& s = *stream->impl_;
+    bool ok = !s.writable || s.writeOut();
+    const os::Handle handle = s.handle;
+    s.handle = os::INVALID_HANDLE;
+    ok = os::closeFile(handle) && ok;
+    delete stream;
+    return ok;
+}
+
+bool File::exist(const StringBase<char>& name) {
+    return kindOf(name) != os::Kind::NONE;
+}
+
+bool File::exist(const FileName& name) {
+    return exist(name.GetText());
+}
+
+bool File::isfile(const StringBase<char>& name) {
+    return kindOf(name) == os::Kind::FILE;
+}
+
+bool File::isfile(const FileName& name) {
+    return isfile(name.GetText());
+}
+
+bool File::isdir(const StringBase<char>& name) {
+    return kindOf(name) == os::Kind::DIRECTORY;
+}
+
+bool File::isdir(const FileName& name) {
+    return isdir(name.GetText());
+}
+
+bool File::canread(const StringBase<char>& name) {
+    std::string native;
+    return systemName(name, native) && os::canRead(native);
+}
+
+bool File::canread(const FileName& name) {
+    return canread(name.GetText());
+}
+
+StringBase<char> File::getcwd() {
+    std::string directory;
+    std::string reason;
+    if (!os::currentDirectory(directory, reason)) {
+        throw std::runtime_error("cannot read the working directory: " + reason);
+    }
+    return StringBase<char>(std::move(directory));
+}
+
+bool File::chdir(const StringBase<char>& directory) {
+    std::string native;
+    return systemName(directory, native) && !native.empty() && os::changeDirectory(native);
+}
+
+}  // namespace Port
+
+UT_DIR::UT_DIR(const Port::StringBase<char>& path, int filter) {
+    if (filter != ALL && filter != DIRECTORIES && filter != FILES) {
+        return;
+    }
+    std::string native;
+    std::vector<Port::os::DirEntry> entries;
+    if (!Port::systemName(path, native) || native.empty() ||
+        !Port::os::readDirectory(native, entries)) {
+        return;
+    }
+    open_ = true;
+    names_.reserve(entries.size());
+    for (auto& entry : entries) {
+        const bool wanted = filter == ALL ||
+                            (filter == DIRECTORIES && entry.kind == Port::os::Kind::DIRECTORY) ||
+                            (filter == FILES && entry.kind == Port::os::Kind::FILE);
+        if (wanted) {
+            names_.emplace_back(std::move(entry.name));
+        }
+    }
+    // Byte order: std::string compares as unsigned characters.
+    std::sort(names_.begin(), names_.end());
+}
+
+UT_DIR::~UT_DIR() = default;
+
+void UT_DIR::close() {
+    names_.clear();
+    open_ = false;
+}
