@@ -3,11 +3,15 @@
 #include <gtest/gtest.h>
 
 #include <filesystem>
+#include <ostream>
+#include <sstream>
 #include <stdexcept>
+#include <streambuf>
 #include <string>
 
 #include "TestSupport.h"
 #include "Tesu_DebugMessenger.h"
+#include "Tesu_MsgMan.h"
 #include "Tesu_SetWorkingDirectory.h"
 
 namespace {
@@ -27,6 +31,29 @@ std::string reconfirmTrace(const std::string& dir) {
 std::string error(const std::string& what, const std::string& dir) {
     return "ERROR:tesutil - Unable to " + what + " working directory to " + dir + "/\n";
 }
+
+// A stream buffer that fails every write once armed.
+class FailingBuffer : public std::streambuf {
+  public:
+    bool armed = false;
+
+  protected:
+    int_type overflow(int_type c) override {
+        fail();
+        return c;
+    }
+    std::streamsize xsputn(const char*, std::streamsize count) override {
+        fail();
+        return count;
+    }
+
+  private:
+    void fail() const {
+        if (armed) {
+            throw std::runtime_error("device full");
+        }
+    }
+};
 
 // Starts every test in <temp>/start with the logger "utilities" at verbose level.
 class WorkingDirectoryTest : public ::testing::Test {
@@ -161,6 +188,27 @@ TEST_F(WorkingDirectoryTest, UnreadableWorkingDirectoryPassesTheLayersException)
     fs::remove(doomed);
     EXPECT_THROW(guard.Reconfirm(), std::runtime_error);
     EXPECT_THROW(Guard(t + "/d"), std::runtime_error);
+}
+
+TEST_F(WorkingDirectoryTest, FailureWhileRevertingIsReportedAndNeverEscapes) {
+    // The revert's trace fails in an output stream; so does the error that reports it.
+    FailingBuffer buffer;
+    std::ostream failing(&buffer);
+    failing.exceptions(std::ios::badbit);
+    std::ostringstream record;
+    Tesu::MsgMan manager(Tesu::MsgMan::DIAG_SILENT);
+    manager.addMsgStream(record);
+    manager.addMsgStream(failing);
+    {
+        Guard guard(t + "/d");
+        buffer.armed = true;
+    }
+    manager.removeMsgStream(failing);
+    manager.removeMsgStream(record);
+    EXPECT_EQ(cwd(), start);
+    EXPECT_EQ(record.str(), setTrace(t + "/d") + revertTrace(start) +
+                                "ERROR:tesutil - Exception while reverting working directory to " +
+                                start + "/\n");
 }
 
 }  // namespace
