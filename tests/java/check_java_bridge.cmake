@@ -1,6 +1,6 @@
 # Runs the Java bridge check program and compares its standard error stream, byte for byte,
 # with the lines the bridge must produce. Arguments (-D): JAVA, JARS (separated by "|"),
-# LIBRARY, HOST_LIBRARY, STDERR_FILE.
+# LIBRARY, HOST_LIBRARY, STDERR_FILE, and PRELOAD (a sanitizer runtime to preload, or empty).
 foreach(var JAVA JARS LIBRARY HOST_LIBRARY STDERR_FILE)
   if(NOT DEFINED ${var})
     message(FATAL_ERROR "${var} is not set")
@@ -11,6 +11,11 @@ if(CMAKE_HOST_WIN32)
   string(REPLACE "|" ";" classpath "${JARS}")
 else()
   string(REPLACE "|" ":" classpath "${JARS}")
+endif()
+
+if(PRELOAD)
+  set(ENV{LD_PRELOAD} "${PRELOAD}")
+  set(ENV{ASAN_OPTIONS} "$ENV{ASAN_OPTIONS}:handle_segv=0:allow_user_segv_handler=1:detect_leaks=0")
 endif()
 
 execute_process(
