@@ -21,10 +21,14 @@ constexpr const char* kRevision = "$Revision 0.0$";
 
 constexpr const char* kRootName = "root";
 
+constexpr std::size_t kRootNameLength = 4;
+
 // The root is recognised by name, in any letter case, both for the short line prefix and
-// in the registry's lookup, so the two always agree.
+// in the registry's lookup, so the two always agree. Texts of another length never compare
+// equal, so most names are settled without the comparison.
 bool IsRootName(const Port::StringBase<char>& name) {
-    return name.Compare(kRootName, Port::COMPARE_NOCASE) == 0;
+    return name.GetLength() == kRootNameLength &&
+           name.Compare(kRootName, Port::COMPARE_NOCASE) == 0;
 }
 
 // Hash of a logger name: each byte, taken as a signed 8-bit value, is added to five times the
