@@ -115,6 +115,19 @@ TEST(PortStream, EmptyFileAndEndOfFile) {
     EXPECT_TRUE(File::close(two));
 }
 
+TEST(PortStream, ReadErrorsEndReading) {
+    // Reading this process's memory from address 0 fails with an input/output error.
+    Stream* failing = File::open("/proc/self/mem", File::READ, true);
+    if (failing == nullptr) {
+        GTEST_SKIP() << "no /proc/self/mem";
+    }
+    EXPECT_TRUE(failing->geteof());
+    Port::StringBase<char> line("kept?");
+    EXPECT_EQ(failing->readline(line), -1);
+    EXPECT_TRUE(line.IsEmpty());
+    EXPECT_TRUE(File::close(failing));
+}
+
 TEST(PortStream, LongLinesAndLinesAcrossTheReadBuffer) {
     tesutest::TempDir tmp;
 

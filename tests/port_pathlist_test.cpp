@@ -4,7 +4,6 @@
 #include <cstdlib>
 #include <filesystem>
 #include <string>
-#include <thread>
 #include <vector>
 
 #include "Port_PathList.h"
@@ -136,27 +135,4 @@ TEST(PortInstallationRoots, WithoutTheVariableTheInstallationPrefix) {
     tesutest::WorkingDirectoryRestorer restore;
     fs::current_path("/");
     EXPECT_EQ(QuarnelPath::GetInstallationPrefix().str(), prefix);
-}
-
-TEST(PortInstallationRoots, FirstUseFromManyThreadsReadsOnce) {
-    RootsVariable variable;
-    variable.set("/t1:/t2:/t3");
-    std::vector<std::thread> threads;
-    std::vector<Texts> seen(8);
-    std::vector<const PathList*> lists(8);
-    for (std::size_t i = 0; i < seen.size(); ++i) {
-        threads.emplace_back([&seen, &lists, i] {
-            lists[i] = &QuarnelPath::GetInstance();
-            for (const auto& root : *lists[i]) {
-                seen[i].push_back(root.str());
-            }
-        });
-    }
-    for (auto& thread : threads) {
-        thread.join();
-    }
-    for (std::size_t i = 0; i < seen.size(); ++i) {
-        EXPECT_EQ(seen[i], (Texts{"/t1", "/t2", "/t3"}));
-        EXPECT_EQ(lists[i], lists[0]);
-    }
 }
