@@ -16,7 +16,6 @@
 namespace {
 
 using Tesu::DebugMessenger;
-using Tesu::DebugMessengerFactory;
 
 // Milliseconds of a duration text "H:MM:SS.mmm"; fails the test on any other form.
 std::int64_t Millis(const Port::StringBase<char>& text) {
@@ -244,16 +243,6 @@ TEST_F(DebugMessengerTest, DestructionWritesOneTotalTimeLineUnlessOff) {
     }
     EXPECT_EQ(capture.text(), "");
     root.SetLevel(DebugMessenger::DEBUG_OFF);
-}
-
-TEST_F(DebugMessengerTest, SuppressedLinesReachNoManager) {
-    DebugMessenger* utilities = DebugMessengerFactory::GetLogger("utilities");
-    utilities->Normal("off by default");
-    utilities->Verbose("off by default");
-    DebugMessengerFactory::GetLogger()->SetLevel(DebugMessenger::DEBUG_NORMAL);
-    utilities->Verbose("still too detailed");
-    utilities->Normal("written");
-    EXPECT_EQ(capture.text(), "DEBUG[utilities] - written\n");
 }
 
 }  // namespace
