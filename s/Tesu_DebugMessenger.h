@@ -40,7 +40,8 @@ class TESU_API DebugMessenger {
     // of `name`; its clock starts now.
     DebugMessenger(DebugMessenger* parentLogger, const Port::StringBase<char>& loggerName);
     // Writes "Total debug time: <time>" at normal level (so only when the effective level is at
-    // least DEBUG_NORMAL), then releases the timers.
+    // least DEBUG_NORMAL), then releases the timers. Nothing escapes: should building or
+    // issuing that line throw, the line is lost.
     ~DebugMessenger();
     DebugMessenger(const DebugMessenger&) = delete;
     DebugMessenger& operator=(const DebugMessenger&) = delete;
