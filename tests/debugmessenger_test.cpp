@@ -84,8 +84,18 @@ TEST_F(DebugMessengerTest, InheritsThroughGenerationsAndFollowsEachChange) {
     EXPECT_TRUE(greatGrandchild.IsDetailed());
     EXPECT_FALSE(greatGrandchild.IsVerbose());
 
-    // IsOff tests equality: a detailed logger is not off, and neither is it at verbose.
+    // IsOff tests equality: a detailed logger is not off.
     EXPECT_FALSE(root.IsOff());
+
+    // A chain that ends without a level (a root set to inherit, a logger without parent)
+    // writes nothing instead of following a null parent.
+    root.SetLevel(DebugMessenger::DEBUG_INHERIT);
+    DebugMessenger orphan(nullptr, "orphan");
+    EXPECT_TRUE(greatGrandchild.IsOff());
+    EXPECT_TRUE(orphan.IsOff());
+    greatGrandchild.Normal("n");
+    orphan.Normal("n");
+    EXPECT_EQ(capture.text(), "");
     root.SetLevel(DebugMessenger::DEBUG_OFF);
 }
 
