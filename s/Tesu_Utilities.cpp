@@ -313,42 +313,56 @@ Port::StringBase<char> ChecksumText(std::uint32_t crc) {
     return text;
 }
 
-// True when the line contributes to the checksum, that is, holds no "#".
-bool IsDataLine(const Port::StringBase<char>& line) {
-    return std::memchr(line.GetText(), '#', line.GetLength()) == nullptr;
-}
-
-// Collects the stored checksum text of a file while its lines go by. The stored text is the
-// eight characters that follow the marker "# CRC:" and one skipped character, read from the
-// file's lines each followed by "\n", so it may run over into the next lines and is shorter
-// when the file ends first.
+// The stored checksum text of a file, collected while its lines go by: the eight characters
+// that follow the first marker "# CRC:" and one skipped character, read from the file's
+// lines each followed by "\n". It may run over into later lines, and is shorter when the
+// file ends first.
 class StoredChecksum {
   public:
     // True once the marker has been seen.
     bool Found() const { return found_; }
-    // Looks for the first marker in `line`; when it is there, starts collecting from it.
-    void Search(const Port::StringBase<char>& line) {
-        const std::size_t marker = line.GetIndexOfString(kMarker, Port::COMPARE_EXACT);
+    // True while characters are still wanted from the lines after the marker's.
+    bool Wanted() const { return found_ && wanted_ > 0; }
+    // Looks for the marker in a line; when it is there, starts collecting from it.
+    void Search(const char* line, std::size_t length) {
+        const std::size_t marker = FindMarker(line, length);
         if (marker != Port::NPOS) {
             found_ = true;
             skip_ = marker + kSkipAfterMarker;
-            Collect(line);
+            Collect(line, length);
         }
     }
-    // Takes what is still needed from the next line after the marker's one.
-    void Collect(const Port::StringBase<char>& line) {
-        if (wanted_ == 0) {
-            return;
+    // Takes what is still wanted from a line after the marker's own.
+    void Collect(const char* line, std::size_t length) {
+        if (wanted_ > 0) {
+            Take(line, length);
+            Take("\n", 1);
         }
-        Take(line.GetText(), line.GetLength());
-        Take("\n", 1);
     }
     const Port::StringBase<char>& Text() const { return text_; }
 
   private:
-    static constexpr const char* kMarker = "# CRC:";
-    // The marker's six characters and the separator after it.
-    static constexpr std::size_t kSkipAfterMarker = 7;
+    static constexpr char kMarker[] = "# CRC:";
+    static constexpr std::size_t kMarkerLength = sizeof kMarker - 1;
+    // The marker and the separator after it.
+    static constexpr std::size_t kSkipAfterMarker = kMarkerLength + 1;
+
+    static std::size_t FindMarker(const char* line, std::size_t length) {
+        std::size_t at = 0;
+        while (length - at >= kMarkerLength) {
+            // Only where the whole marker fits.
+            const void* hash = std::memchr(line + at, '#', length - at - kMarkerLength + 1);
+            if (hash == nullptr) {
+                break;
+            }
+            at = static_cast<std::size_t>(static_cast<const char*>(hash) - line);
+            if (std::memcmp(line + at, kMarker, kMarkerLength) == 0) {
+                return at;
+            }
+            ++at;
+        }
+        return Port::NPOS;
+    }
 
     void Take(const char* data, std::size_t length) {
         const std::size_t skipped = skip_ < length ? skip_ : length;
@@ -364,6 +378,99 @@ class StoredChecksum {
     std::size_t skip_ = 0;
     std::size_t wanted_ = 8;
     Port::StringBase<char> text_;
+};
+
+// Follows a checksummed file line by line: the CRC-32 of the lines without "#", joined, and
+// the stored checksum text. Lines are gathered into a bounded batch and handled a batch at a
+// time: one search for "#" runs over the whole batch and the CRC over the long stretches of
+// data lines between comment lines, several times as fast as line by line. A line as long
+// as a batch is handled by itself, so memory stays bounded by the longest line.
+class ChecksumScan {
+  public:
+    // A batch is flushed once it reaches kBatchBytes, and only lines shorter than that enter
+    // it, so it never outgrows twice that size.
+    ChecksumScan() : batch_(2 * kBatchBytes) { ends_.reserve(kBatchLines); }
+    ChecksumScan(const ChecksumScan&) = delete;
+    ChecksumScan& operator=(const ChecksumScan&) = delete;
+
+    // The next line of the file, without its line break.
+    void Add(const Port::StringBase<char>& line) {
+        if (line.GetLength() >= kBatchBytes) {
+            Flush();
+            AddAlone(line.GetText(), line.GetLength());
+            return;
+        }
+        std::memcpy(batch_.data() + used_, line.GetText(), line.GetLength());
+        used_ += line.GetLength();
+        ends_.push_back(used_);
+        if (used_ >= kBatchBytes || ends_.size() >= kBatchLines) {
+            Flush();
+        }
+    }
+    // After the last line: the CRC of the data lines.
+    std::uint32_t Finish() {
+        Flush();
+        return crc_;
+    }
+    const StoredChecksum& Stored() const { return stored_; }
+
+  private:
+    static constexpr std::size_t kBatchBytes = 64 * 1024;
+    static constexpr std::size_t kBatchLines = 4096;
+
+    void AddAlone(const char* line, std::size_t length) {
+        const bool dataLine = std::memchr(line, '#', length) == nullptr;
+        if (dataLine) {
+            crc_ = Port::StringBase<char>::CRC32(crc_, line, length);
+        }
+        if (stored_.Found()) {
+            stored_.Collect(line, length);
+        } else if (!dataLine) {
+            stored_.Search(line, length);
+        }
+    }
+
+    void Flush() {
+        const char* bytes = batch_.data();
+        const std::size_t size = used_;
+        CollectFrom(0);
+        std::size_t dataStart = 0;  // the first byte not yet in the CRC
+        std::size_t line = 0;       // the line that holds the next "#"
+        while (dataStart < size) {
+            const void* hash = std::memchr(bytes + dataStart, '#', size - dataStart);
+            if (hash == nullptr) {
+                break;
+            }
+            const std::size_t at = static_cast<std::size_t>(static_cast<const char*>(hash) - bytes);
+            while (ends_[line] <= at) {
+                ++line;
+            }
+            const std::size_t lineStart = line == 0 ? 0 : ends_[line - 1];
+            crc_ = Port::StringBase<char>::CRC32(crc_, bytes + dataStart, lineStart - dataStart);
+            if (!stored_.Found()) {
+                stored_.Search(bytes + lineStart, ends_[line] - lineStart);
+                CollectFrom(line + 1);
+            }
+            dataStart = ends_[line];
+        }
+        crc_ = Port::StringBase<char>::CRC32(crc_, bytes + dataStart, size - dataStart);
+        used_ = 0;
+        ends_.clear();
+    }
+
+    // Hands the batch's lines from `first` on to the stored text while it wants more.
+    void CollectFrom(std::size_t first) {
+        for (std::size_t line = first; stored_.Wanted() && line < ends_.size(); ++line) {
+            const std::size_t start = line == 0 ? 0 : ends_[line - 1];
+            stored_.Collect(batch_.data() + start, ends_[line] - start);
+        }
+    }
+
+    std::uint32_t crc_ = 0;
+    StoredChecksum stored_;
+    std::vector<char> batch_;        // the lines, joined
+    std::size_t used_ = 0;           // bytes of the batch in use
+    std::vector<std::size_t> ends_;  // where each line of the batch ends
 };
 
 }  // namespace
@@ -392,30 +499,21 @@ unsigned int Utilities::ValidateFileChecksum(const Port::StringBase<char>& fileN
     }
     StreamCloser closer(stream);
 
-    // One pass over the lines: data lines feed the CRC, the first marker starts the stored
-    // text. Only the current line is held, so memory does not grow with the file.
-    std::uint32_t crc = 0;
-    StoredChecksum stored;
+    // One pass over the lines; only a bounded batch of them is held at any time.
+    ChecksumScan scan;
     Port::StringBase<char> line;
     while (!stream->geteof()) {
         stream->readline(line);
-        const bool dataLine = IsDataLine(line);
-        if (dataLine) {
-            crc = Port::StringBase<char>::CRC32(crc, line.GetText(), line.GetLength());
-        }
-        if (stored.Found()) {
-            stored.Collect(line);
-        } else if (!dataLine) {
-            // The marker holds "#", so only comment lines can carry it.
-            stored.Search(line);
-        }
+        scan.Add(line);
     }
+    const std::uint32_t crc = scan.Finish();
 
     if (!closer.close()) {
         messageSource(__LINE__).issueError("Could not close %s\n", fileName.GetText());
         verdict = false;
         return 1;
     }
+    const StoredChecksum& stored = scan.Stored();
     if (stored.Found() && stored.Text().Compare(ChecksumText(crc), Port::COMPARE_NOCASE) != 0) {
         verdict = false;
     }

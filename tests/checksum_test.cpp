@@ -5,6 +5,7 @@
 
 #include <filesystem>
 #include <string>
+#include <vector>
 
 #include "Port_String.h"
 #include "TestSupport.h"
@@ -174,6 +175,55 @@ TEST(ValidateFileChecksum, LineEndsAndBytesThatAreNotPlainText) {
     std::string changed = longLine;
     changed[changed.size() / 2] = '!';
     ExpectInvalid(dir, stamp + changed + "\n", "long data line changed in the middle");
+}
+
+// The reader works through a file in blocks of up to 64 KiB of line text or 4096 lines. The
+// checksum line, in its plain form and in the form whose value stands on the next line, is
+// put at every place around the end of a first block, by bytes and by lines.
+TEST(ValidateFileChecksum, ChecksumLineAtTheEdgesOfTheReadersBlocks) {
+    tesutest::TempDir dir;
+    const std::string after = "tail\n\nend\n";
+    auto check = [&](const std::string& before, const std::string& what) {
+        const std::string sum = Sum(before + after);
+        ExpectValid(dir, before + "# CRC: " + sum + "\n" + after, what + ", plain");
+        ExpectValid(dir, before + "# CRC:\n" + sum + "#\n" + after, what + ", value below");
+        ExpectInvalid(dir, before + "# CRC: " + sum + "\n#" + after,
+                      what + ", next line a comment");
+        ExpectInvalid(dir, before + "# CRC:\n" + sum + "#\nt" + after,
+                      what + ", next data changed");
+    };
+    std::string lines;
+    for (int i = 0; i < 1000; ++i) {
+        lines += std::string(60, static_cast<char>('a' + i % 26)) + "\n";
+    }
+    // 60,000 characters of lines, a line of `pad` characters, then the checksum line.
+    for (std::size_t pad = 5500; pad <= 5540; ++pad) {
+        check(lines + std::string(pad, 'p') + "\n", "after " + std::to_string(60000 + pad));
+    }
+    for (int count = 4088; count <= 4098; ++count) {
+        std::string shortLines;
+        for (int i = 0; i < count; ++i) {
+            shortLines += i % 9 == 0 ? "# c\n" : "l\n";
+        }
+        check(shortLines, "after " + std::to_string(count) + " lines");
+    }
+}
+
+// Lines longer than the reader's blocks, among short ones, hold data, comments and the value.
+TEST(ValidateFileChecksum, LongLinesAmongShortOnes) {
+    tesutest::TempDir dir;
+    const std::string longData(200 * 1024, 'd');
+    const std::string longComment = "#" + std::string(100 * 1024, 'c');
+    const std::string body = "short\n" + longData + "\n" + longComment + "\nshort again\n" +
+                             std::string(70 * 1024, 'e') + "\n";
+    const std::string sum = Sum(body);
+    ExpectValid(dir, body + "# CRC: " + sum + "\n", "checksum line after long lines");
+    ExpectValid(dir, "# CRC: " + sum + "\n" + body, "checksum line before long lines");
+    ExpectValid(dir, "# CRC:\n" + sum + longComment + "\n" + body,
+                "value at the start of a long comment line");
+    ExpectValid(dir, "x" + longComment + " # CRC: " + sum + "\n" + body,
+                "marker at the end of a long comment line");
+    ExpectInvalid(dir, "# CRC: " + sum + "\n" + body + longData + "\n", "long data line added");
 }
 
 TEST(ValidateFileChecksum, FilesWithNothingToSum) {

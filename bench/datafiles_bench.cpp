@@ -1,0 +1,341 @@
+// Data files: checking a large checksummed file against the raw speed of reading it, its
+// memory, the CRC-32 against libdeflate and zlib called directly, and reading a long file
+// list. The data is generated in a temporary directory and removed at the end. Rates are
+// per processor second (kernel time included), so the load of other processes counts little.
+//
+//   BM_FreadFile                   the file read with std::fread into a 1 MiB buffer.
+//   BM_ReadLinesOnly               its lines read through the layer, nothing more: the floor
+//                                  under the check, which reads the file this way.
+//   BM_ValidateFileChecksum        the check; peak_MiB: the peak resident memory during the
+//                                  checks above the resident memory before them.
+//   BM_ValidateVersusFread         vs_fread: the check's speed over fread's (one fread pass
+//                                  and one check per iteration, timed side by side).
+//   BM_Crc32_*                     the CRC-32 of 64 MiB: the layer's, libdeflate's, zlib's;
+//                                  vs_libdeflate: the layer's speed over libdeflate's.
+//   BM_FileListFileStrings         a list of 10,000 existing members; per_member: the time
+//                                  per member.
+// Targets: the check at 40% of fread's speed or more and under 16 MiB above the baseline;
+// the layer's CRC-32 at 90% of libdeflate's or more.
+#include <benchmark/benchmark.h>
+#include <time.h>
+#include <unistd.h>
+#include <zlib.h>
+
+#include <cstdint>
+#include <cstdio>
+#include <cstring>
+#include <filesystem>
+#include <fstream>
+#include <random>
+#include <stdexcept>
+#include <string>
+#include <vector>
+
+#if defined(TESU_BENCH_LIBDEFLATE)
+#include <libdeflate.h>
+#endif
+
+#include "Port_File.h"
+#include "Port_FileName.h"
+#include "Port_String.h"
+#include "Tesu_Utilities.h"
+
+namespace fs = std::filesystem;
+
+namespace {
+
+constexpr std::size_t kMiB = 1024 * 1024;
+constexpr std::size_t kChecksummedSize = 256 * kMiB;
+constexpr std::size_t kLineLength = 80;  // with its line break
+constexpr std::size_t kCrcSize = 64 * kMiB;
+constexpr int kListMembers = 10000;
+
+// The folder of the generated data, made on first use and removed by main.
+const fs::path& DataDirectory() {
+    static const fs::path directory = [] {
+        fs::path path =
+            fs::temp_directory_path() / ("tesu-datafiles-bench-" + std::to_string(getpid()));
+        fs::create_directories(path);
+        return path;
+    }();
+    return directory;
+}
+
+// A file of 80-character lines, one in twenty a comment, stamped at its end with a valid
+// checksum line.
+const std::string& ChecksummedFile() {
+    static const std::string path = [] {
+        const std::string name = (DataDirectory() / "checksummed.txt").string();
+        std::FILE* out = std::fopen(name.c_str(), "wb");
+        if (out == nullptr) {
+            throw std::runtime_error("cannot write " + name);
+        }
+        // Lines are cut from a pool of random printable text (no "#") at varying offsets.
+        std::mt19937 random(42);
+        std::uniform_int_distribution<int> printable(' ', '~');
+        std::string pool(64 * 1024, ' ');
+        for (char& c : pool) {
+            c = static_cast<char>(printable(random));
+            if (c == '#') {
+                c = '+';
+            }
+        }
+        std::string block;
+        std::uint32_t crc = 0;
+        const std::size_t lines = kChecksummedSize / kLineLength - 1;
+        const std::size_t textLength = kLineLength - 1;
+        for (std::size_t i = 0; i < lines; ++i) {
+            const std::size_t at = block.size();
+            block.append(pool, (i * 7919) % (pool.size() - textLength), textLength);
+            if (i % 20 == 0) {
+                block.replace(at, 10, "# comment ");
+            } else {
+                crc = Port::StringBase<char>::CRC32(crc, block.data() + at, textLength);
+            }
+            block += '\n';
+            if (block.size() >= kMiB) {
+                std::fwrite(block.data(), 1, block.size(), out);
+                block.clear();
+            }
+        }
+        char stamp[32];
+        std::snprintf(stamp, sizeof stamp, "# CRC: %8x\n", static_cast<unsigned int>(crc));
+        block += stamp;
+        std::fwrite(block.data(), 1, block.size(), out);
+        if (std::fclose(out) != 0) {
+            throw std::runtime_error("cannot write " + name);
+        }
+        return name;
+    }();
+    return path;
+}
+
+// The processor time of the process so far, in seconds: kernel time included, since reading
+// a file is mostly the kernel's copying. The load of other processes does not count.
+double CpuSeconds() {
+    timespec now{};
+    clock_gettime(CLOCK_PROCESS_CPUTIME_ID, &now);
+    return static_cast<double>(now.tv_sec) + static_cast<double>(now.tv_nsec) * 1e-9;
+}
+
+// A value in kB from /proc/self/status ("VmRSS", "VmHWM"), or -1.
+long StatusKiB(const char* key) {
+    std::ifstream status("/proc/self/status");
+    std::string line;
+    const std::size_t keyLength = std::strlen(key);
+    while (std::getline(status, line)) {
+        if (line.compare(0, keyLength, key) == 0 && line.size() > keyLength &&
+            line[keyLength] == ':') {
+            return std::stol(line.substr(keyLength + 1));
+        }
+    }
+    return -1;
+}
+
+// Sets the peak resident size back to the current one; false where the kernel does not allow.
+bool ResetPeakMemory() {
+    std::ofstream clear("/proc/self/clear_refs");
+    clear << "5";
+    clear.flush();
+    return static_cast<bool>(clear);
+}
+
+void BM_FreadFile(benchmark::State& state) {
+    const std::string& path = ChecksummedFile();
+    std::vector<char> buffer(kMiB);
+    std::size_t total = 0;
+    for (auto _ : state) {
+        std::FILE* in = std::fopen(path.c_str(), "rb");
+        if (in == nullptr) {
+            state.SkipWithError("cannot open the file");
+            return;
+        }
+        std::size_t got = 0;
+        while ((got = std::fread(buffer.data(), 1, buffer.size(), in)) > 0) {
+            total += got;
+        }
+        std::fclose(in);
+        benchmark::DoNotOptimize(buffer.data());
+    }
+    state.SetBytesProcessed(static_cast<std::int64_t>(total));
+}
+
+// Reading the same file's lines through the layer with nothing else done: the floor under
+// the check, which reads the file this way.
+void BM_ReadLinesOnly(benchmark::State& state) {
+    const Port::StringBase<char> path(ChecksummedFile());
+    const std::size_t size = fs::file_size(path.str());
+    Port::StringBase<char> line;
+    for (auto _ : state) {
+        Port::Stream* stream = Port::File::open(path, Port::File::READ, true);
+        if (stream == nullptr) {
+            state.SkipWithError("cannot open the file");
+            return;
+        }
+        while (!stream->geteof()) {
+            stream->readline(line);
+        }
+        Port::File::close(stream);
+    }
+    state.SetBytesProcessed(static_cast<std::int64_t>(size * state.iterations()));
+}
+
+void BM_ValidateFileChecksum(benchmark::State& state) {
+    const Port::StringBase<char> path(ChecksummedFile());
+    const std::size_t size = fs::file_size(path.str());
+    const bool peakReset = ResetPeakMemory();
+    const long baselineKiB = peakReset ? StatusKiB("VmRSS") : StatusKiB("VmHWM");
+    for (auto _ : state) {
+        bool verdict = false;
+        const unsigned int result = Tesu::Utilities::ValidateFileChecksum(path, verdict);
+        if (result != 0 || !verdict) {
+            state.SkipWithError("the generated file does not validate");
+            return;
+        }
+    }
+    const long peakKiB = StatusKiB("VmHWM");
+    state.SetBytesProcessed(static_cast<std::int64_t>(size * state.iterations()));
+    state.counters["peak_MiB"] = static_cast<double>(peakKiB - baselineKiB) / 1024.0;
+    if (!peakReset) {
+        state.SetLabel("peak not reset: lower bound");
+    }
+}
+
+// One fread pass and one check per iteration, their processor times taken side by side so
+// that the ratio is measured under the same conditions.
+void BM_ValidateVersusFread(benchmark::State& state) {
+    const std::string& path = ChecksummedFile();
+    std::vector<char> buffer(kMiB);
+    double freadSeconds = 0.0;
+    double validateSeconds = 0.0;
+    for (auto _ : state) {
+        const auto start = CpuSeconds();
+        std::FILE* in = std::fopen(path.c_str(), "rb");
+        while (in != nullptr && std::fread(buffer.data(), 1, buffer.size(), in) > 0) {
+        }
+        if (in != nullptr) {
+            std::fclose(in);
+        }
+        const auto middle = CpuSeconds();
+        bool verdict = false;
+        Tesu::Utilities::ValidateFileChecksum(Port::StringBase<char>(path), verdict);
+        const auto end = CpuSeconds();
+        freadSeconds += middle - start;
+        validateSeconds += end - middle;
+    }
+    state.counters["vs_fread"] = validateSeconds > 0.0 ? freadSeconds / validateSeconds : 0.0;
+}
+
+const std::vector<unsigned char>& CrcData() {
+    static const std::vector<unsigned char> data = [] {
+        std::vector<unsigned char> bytes(kCrcSize);
+        std::mt19937 random(7);
+        for (auto& byte : bytes) {
+            byte = static_cast<unsigned char>(random());
+        }
+        return bytes;
+    }();
+    return data;
+}
+
+void BM_Crc32_Port(benchmark::State& state) {
+    const auto& data = CrcData();
+    for (auto _ : state) {
+        benchmark::DoNotOptimize(Port::StringBase<char>::CRC32(0, data.data(), data.size()));
+    }
+    state.SetBytesProcessed(static_cast<std::int64_t>(data.size() * state.iterations()));
+    state.SetLabel(Port::StringBase<char>::CRC32Implementation());
+}
+
+#if defined(TESU_BENCH_LIBDEFLATE)
+void BM_Crc32_Libdeflate(benchmark::State& state) {
+    const auto& data = CrcData();
+    for (auto _ : state) {
+        benchmark::DoNotOptimize(libdeflate_crc32(0, data.data(), data.size()));
+    }
+    state.SetBytesProcessed(static_cast<std::int64_t>(data.size() * state.iterations()));
+}
+
+// The layer's CRC-32 and libdeflate's over the same data, timed side by side.
+void BM_Crc32_PortVersusLibdeflate(benchmark::State& state) {
+    const auto& data = CrcData();
+    double portSeconds = 0.0;
+    double libdeflateSeconds = 0.0;
+    for (auto _ : state) {
+        const auto start = CpuSeconds();
+        benchmark::DoNotOptimize(Port::StringBase<char>::CRC32(0, data.data(), data.size()));
+        const auto middle = CpuSeconds();
+        benchmark::DoNotOptimize(libdeflate_crc32(0, data.data(), data.size()));
+        const auto end = CpuSeconds();
+        portSeconds += middle - start;
+        libdeflateSeconds += end - middle;
+    }
+    state.counters["vs_libdeflate"] = portSeconds > 0.0 ? libdeflateSeconds / portSeconds : 0.0;
+}
+#endif
+
+void BM_Crc32_Zlib(benchmark::State& state) {
+    const auto& data = CrcData();
+    for (auto _ : state) {
+        benchmark::DoNotOptimize(crc32(0L, data.data(), static_cast<uInt>(data.size())));
+    }
+    state.SetBytesProcessed(static_cast<std::int64_t>(data.size() * state.iterations()));
+}
+
+// A list of 10,000 existing members in a few subdirectories.
+const std::string& FileList() {
+    static const std::string path = [] {
+        const fs::path directory = DataDirectory() / "list";
+        std::string content = "# generated members\n";
+        for (int i = 0; i < kListMembers; ++i) {
+            const std::string member =
+                "group" + std::to_string(i % 10) + "/member" + std::to_string(i) + ".v";
+            fs::create_directories((directory / member).parent_path());
+            std::ofstream(directory / member).put('\n');
+            content += member + (i % 7 == 0 ? "  # with a comment\n" : "\n");
+        }
+        const std::string name = (directory / "files.lst").string();
+        std::ofstream(name) << content;
+        return name;
+    }();
+    return path;
+}
+
+void BM_FileListFileStrings(benchmark::State& state) {
+    const Port::FileName list(FileList().c_str());
+    for (auto _ : state) {
+        const auto members = Tesu::Utilities::GetFileListFileStrings(list);
+        if (members.size() != static_cast<std::size_t>(kListMembers)) {
+            state.SkipWithError("members missing from the list");
+            return;
+        }
+    }
+    state.counters["per_member"] = benchmark::Counter(
+        kListMembers, benchmark::Counter::kIsIterationInvariantRate | benchmark::Counter::kInvert);
+}
+
+}  // namespace
+
+BENCHMARK(BM_FreadFile)->Unit(benchmark::kMillisecond)->MinTime(2.0);
+BENCHMARK(BM_ReadLinesOnly)->Unit(benchmark::kMillisecond)->MinTime(1.0);
+BENCHMARK(BM_ValidateFileChecksum)->Unit(benchmark::kMillisecond)->MinTime(2.0);
+BENCHMARK(BM_ValidateVersusFread)->Unit(benchmark::kMillisecond)->Iterations(3);
+BENCHMARK(BM_Crc32_Port)->Unit(benchmark::kMillisecond);
+#if defined(TESU_BENCH_LIBDEFLATE)
+BENCHMARK(BM_Crc32_Libdeflate)->Unit(benchmark::kMillisecond);
+BENCHMARK(BM_Crc32_PortVersusLibdeflate)->Unit(benchmark::kMillisecond)->Iterations(20);
+#endif
+BENCHMARK(BM_Crc32_Zlib)->Unit(benchmark::kMillisecond);
+BENCHMARK(BM_FileListFileStrings)->Unit(benchmark::kMillisecond);
+
+int main(int argc, char** argv) {
+    benchmark::Initialize(&argc, argv);
+    if (benchmark::ReportUnrecognizedArguments(argc, argv)) {
+        return 1;
+    }
+    benchmark::RunSpecifiedBenchmarks();
+    benchmark::Shutdown();
+    std::error_code ignored;
+    fs::remove_all(DataDirectory(), ignored);
+    return 0;
+}
