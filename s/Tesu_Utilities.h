@@ -81,17 +81,22 @@ class TESU_API Utilities {
 
     // ---- Checksummed files ---------------------------------------------------------------
     // A checksummed file carries "# CRC:", one skipped character and eight characters: the
-    // "%8x" text of the CRC-32 of its lines that hold no "#", joined without separators.
+    // "%8x" text (lower-case hexadecimal, padded with blanks) of the CRC-32 of its lines that
+    // hold no "#", joined without separators. Every byte of those lines counts, NUL bytes
+    // included; the line reader drops the "\r" of a CR-LF end, so CR-LF and LF files agree.
 
     // Sets `checksum` to the eight-character checksum text of `text` (lines separated by
     // "\n"). Returns 0.
     static unsigned int CalculateChecksum(const Port::StringBase<char>& text,
                                           Port::StringBase<char>& checksum);
-    // Checks the file `fileName` against its own checksum line. Returns 0 when the file was
-    // read and closed, with `verdict` true when it holds no "# CRC:" or the stored text
-    // matches, false otherwise; returns 1 with `verdict` false when it cannot be opened
+    // Checks the file `fileName` against its own checksum line: the first "# CRC:" anywhere
+    // counts, and its eight characters are read on across line breaks (each line followed by
+    // "\n") when the line ends first. Returns 0 when the file was read and closed, with
+    // `verdict` true when it holds no "# CRC:" or the stored text matches (letter case
+    // ignored), false otherwise; returns 1 with `verdict` false when it cannot be opened
     // (error "Could not open <name>") or closed (error "Could not close <name>"), naming the
-    // file as passed. Memory use does not grow with the file's size.
+    // file as passed. The file is read in one pass; memory use is bounded by its longest
+    // line, not by its size.
     static unsigned int ValidateFileChecksum(const Port::StringBase<char>& fileName, bool& verdict);
 
     // ---- File lists ----------------------------------------------------------------------
@@ -100,12 +105,15 @@ class TESU_API Utilities {
     // separators (normalised to the platform's, runs collapsed). Missing members are left
     // out with the warning "Missing file list member <absolute path>". An unreadable list gives
     // the error "Cannot read <absolute path>", one that does not open "Cannot open <...>", and
-    // an empty result. Traces "Reading file list <absolute path>" at normal level on
-    // "utilities".
+    // an empty result; a list that does not close gives "Cannot close <...>" and the members
+    // all the same. Traces "Reading file list <absolute path>" at normal level on
+    // "utilities". Every member is joined to the list's directory part (GetHead(true, false)),
+    // also one that is itself absolute; a directory counts as an existing member.
 
     // The cleaned member texts of every existing member, in list order (repeats kept).
     static std::vector<Port::StringBase<char>> GetFileListFileStrings(const Port::FileName& list);
-    // The same members as file names: the list's directory part followed by the member text.
+    // The same members as file names: the list's directory part followed by the member text
+    // (not made absolute; existence is not tested again).
     static std::vector<Port::FileName> GetFileListFileNames(const Port::FileName& list);
 };
 

@@ -87,11 +87,14 @@ TEST_F(FileListTest, MissingMembersAreWarnedAboutAndLeftOut) {
                                        "sub/dir/../dir\\file.v\n"
                                        "../outside.v # not there\n"
                                        "b.v\n"
-                                       "gone.v\n");
+                                       "gone.v\n" +
+                                           dir.join("lists/a.v") + "\n");
     tesutest::MessageCapture capture;
     EXPECT_EQ((std::vector<std::string>{"a.v", "sub/dir/../dir/file.v", "b.v"}), Strings(list));
     // The member text is kept as written; the warnings name the absolute, normalised path.
-    EXPECT_EQ(Missing("lists/gone.v") + Missing("outside.v") + Missing("lists/gone.v"),
+    // An absolute member is joined to the list's directory like any other.
+    EXPECT_EQ(Missing("lists/gone.v") + Missing("outside.v") + Missing("lists/gone.v") +
+                  Missing("lists" + dir.join("lists/a.v")),
               capture.text());
 }
 
