@@ -3,6 +3,7 @@
 #include <cstdint>
 #include <cstring>
 #include <exception>
+#include <string>
 #include <vector>
 
 #include "Port_Env.h"
@@ -381,30 +382,33 @@ class StoredChecksum {
 };
 
 // Follows a checksummed file line by line: the CRC-32 of the lines without "#", joined, and
-// the stored checksum text. Lines are gathered into a bounded batch and handled a batch at a
-// time: one search for "#" runs over the whole batch and the CRC over the long stretches of
-// data lines between comment lines, several times as fast as line by line. A line as long
-// as a batch is handled by itself, so memory stays bounded by the longest line.
+// the stored checksum text. Data lines are gathered into a bounded batch so that the CRC runs
+// over long stretches instead of line by line; a line as long as a batch goes to the CRC by
+// itself, so memory stays bounded.
 class ChecksumScan {
   public:
-    // A batch is flushed once it reaches kBatchBytes, and only lines shorter than that enter
-    // it, so it never outgrows twice that size.
-    ChecksumScan() : batch_(2 * kBatchBytes) { ends_.reserve(kBatchLines); }
+    ChecksumScan() : batch_(kBatchBytes) {}
     ChecksumScan(const ChecksumScan&) = delete;
     ChecksumScan& operator=(const ChecksumScan&) = delete;
 
     // The next line of the file, without its line break.
-    void Add(const Port::StringBase<char>& line) {
-        if (line.GetLength() >= kBatchBytes) {
-            Flush();
-            AddAlone(line.GetText(), line.GetLength());
-            return;
+    void Add(const char* line, std::size_t length) {
+        const bool dataLine = std::memchr(line, '#', length) == nullptr;
+        if (dataLine) {
+            if (length > kBatchBytes - used_) {
+                Flush();
+            }
+            if (length >= kBatchBytes) {
+                crc_ = Port::StringBase<char>::CRC32(crc_, line, length);
+            } else {
+                std::memcpy(batch_.data() + used_, line, length);
+                used_ += length;
+            }
         }
-        std::memcpy(batch_.data() + used_, line.GetText(), line.GetLength());
-        used_ += line.GetLength();
-        ends_.push_back(used_);
-        if (used_ >= kBatchBytes || ends_.size() >= kBatchLines) {
-            Flush();
+        if (stored_.Found()) {
+            stored_.Collect(line, length);
+        } else if (!dataLine) {
+            stored_.Search(line, length);
         }
     }
     // After the last line: the CRC of the data lines.
@@ -416,62 +420,57 @@ class ChecksumScan {
 
   private:
     static constexpr std::size_t kBatchBytes = 64 * 1024;
-    static constexpr std::size_t kBatchLines = 4096;
-
-    void AddAlone(const char* line, std::size_t length) {
-        const bool dataLine = std::memchr(line, '#', length) == nullptr;
-        if (dataLine) {
-            crc_ = Port::StringBase<char>::CRC32(crc_, line, length);
-        }
-        if (stored_.Found()) {
-            stored_.Collect(line, length);
-        } else if (!dataLine) {
-            stored_.Search(line, length);
-        }
-    }
 
     void Flush() {
-        const char* bytes = batch_.data();
-        const std::size_t size = used_;
-        CollectFrom(0);
-        std::size_t dataStart = 0;  // the first byte not yet in the CRC
-        std::size_t line = 0;       // the line that holds the next "#"
-        while (dataStart < size) {
-            const void* hash = std::memchr(bytes + dataStart, '#', size - dataStart);
-            if (hash == nullptr) {
-                break;
-            }
-            const std::size_t at = static_cast<std::size_t>(static_cast<const char*>(hash) - bytes);
-            while (ends_[line] <= at) {
-                ++line;
-            }
-            const std::size_t lineStart = line == 0 ? 0 : ends_[line - 1];
-            crc_ = Port::StringBase<char>::CRC32(crc_, bytes + dataStart, lineStart - dataStart);
-            if (!stored_.Found()) {
-                stored_.Search(bytes + lineStart, ends_[line] - lineStart);
-                CollectFrom(line + 1);
-            }
-            dataStart = ends_[line];
-        }
-        crc_ = Port::StringBase<char>::CRC32(crc_, bytes + dataStart, size - dataStart);
+        crc_ = Port::StringBase<char>::CRC32(crc_, batch_.data(), used_);
         used_ = 0;
-        ends_.clear();
-    }
-
-    // Hands the batch's lines from `first` on to the stored text while it wants more.
-    void CollectFrom(std::size_t first) {
-        for (std::size_t line = first; stored_.Wanted() && line < ends_.size(); ++line) {
-            const std::size_t start = line == 0 ? 0 : ends_[line - 1];
-            stored_.Collect(batch_.data() + start, ends_[line] - start);
-        }
     }
 
     std::uint32_t crc_ = 0;
     StoredChecksum stored_;
-    std::vector<char> batch_;        // the lines, joined
-    std::size_t used_ = 0;           // bytes of the batch in use
-    std::vector<std::size_t> ends_;  // where each line of the batch ends
+    std::vector<char> batch_;  // data lines, joined
+    std::size_t used_ = 0;     // bytes of the batch in use
 };
+
+// Hands every line of `stream` to `scan`, split exactly as Port::Stream::readline splits them
+// (at "\n", the "\r" of a "\r\n" end dropped, a last line without a line break kept as it
+// is, no line after a final line break), but a block at a time: a line that lies whole in a
+// block is handed over in place, without a copy; only a line that runs over the end of a block
+// is gathered in `carry`.
+void ScanLines(Port::Stream& stream, ChecksumScan& scan) {
+    std::string carry;
+    const char* block = nullptr;
+    for (std::size_t size = stream.readblock(block); size > 0; size = stream.readblock(block)) {
+        const char* next = block;
+        const char* const end = block + size;
+        while (next < end) {
+            const char* lineBreak = static_cast<const char*>(
+                std::memchr(next, '\n', static_cast<std::size_t>(end - next)));
+            if (lineBreak == nullptr) {
+                carry.append(next, static_cast<std::size_t>(end - next));
+                break;
+            }
+            if (carry.empty()) {
+                const char* lineEnd = lineBreak;
+                if (lineEnd > next && lineEnd[-1] == '\r') {
+                    --lineEnd;
+                }
+                scan.Add(next, static_cast<std::size_t>(lineEnd - next));
+            } else {
+                carry.append(next, static_cast<std::size_t>(lineBreak - next));
+                if (carry.back() == '\r') {
+                    carry.pop_back();
+                }
+                scan.Add(carry.data(), carry.size());
+                carry.clear();
+            }
+            next = lineBreak + 1;
+        }
+    }
+    if (!carry.empty()) {
+        scan.Add(carry.data(), carry.size());
+    }
+}
 
 }  // namespace
 
@@ -501,11 +500,7 @@ unsigned int Utilities::ValidateFileChecksum(const Port::StringBase<char>& fileN
 
     // One pass over the lines; only a bounded batch of them is held at any time.
     ChecksumScan scan;
-    Port::StringBase<char> line;
-    while (!stream->geteof()) {
-        stream->readline(line);
-        scan.Add(line);
-    }
+    ScanLines(*stream, scan);
     const std::uint32_t crc = scan.Finish();
 
     if (!closer.close()) {

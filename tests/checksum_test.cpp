@@ -195,6 +195,31 @@ TEST(ValidateFileChecksum, ChecksumLineAtTheEdgesOfTheReadersBlocks) {
     for (std::size_t pad = 5500; pad <= 5540; ++pad) {
         check(lines + std::string(pad, 'p') + "\n", "after " + std::to_string(60000 + pad));
     }
+    // Around the end of the layer's first read block (256 KiB), with plain and CR-LF line
+    // ends: the marker, the stored value and a "\r\n" pair each fall across the edge.
+    std::string bigLines;
+    std::string bigCrLfLines;
+    for (int i = 0; i < 4290; ++i) {
+        const std::string text(60, static_cast<char>('a' + i % 26));
+        bigLines += text + "\n";
+        bigCrLfLines += text + "\r\n";
+    }
+    for (std::size_t pad = 430; pad <= 470; ++pad) {
+        check(bigLines + std::string(pad, 'p') + "\n", "LF, pad " + std::to_string(pad));
+    }
+    std::string lfOfCrLf = bigCrLfLines;
+    for (std::size_t at = lfOfCrLf.find('\r'); at != std::string::npos;
+         at = lfOfCrLf.find('\r', at)) {
+        lfOfCrLf.erase(at, 1);
+    }
+    // A prefix of 0 to 61 characters puts every byte of a 62-byte line on the edge once.
+    for (std::size_t pad = 0; pad < 62; ++pad) {
+        const std::string prefix(pad, 'q');
+        ExpectValid(
+            dir,
+            prefix + bigCrLfLines + "# CRC: " + Sum(prefix + lfOfCrLf + after) + "\r\n" + after,
+            "CR-LF lines after a prefix of " + std::to_string(pad));
+    }
     for (int count = 4088; count <= 4098; ++count) {
         std::string shortLines;
         for (int i = 0; i < count; ++i) {

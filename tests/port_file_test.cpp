@@ -172,6 +172,38 @@ TEST(PortStream, LongLinesAndLinesAcrossTheReadBuffer) {
     EXPECT_EQ(readLines(tmp.write("random", content)), expectedLines(content));
 }
 
+// readblock lends every byte exactly once, in order, also when mixed with readline, and
+// gives nothing past the end or on a stream opened for writing.
+TEST(PortStream, ReadblockLendsEveryByteOnce) {
+    tesutest::TempDir dir;
+    std::string content = "first line\r\nsecond\n";
+    for (int i = 0; content.size() < 700 * 1024; ++i) {
+        content += std::string(static_cast<std::size_t>(i % 97), static_cast<char>('a' + i % 26));
+        content += '\n';
+    }
+    const std::string path = dir.write("blocks.txt", content);
+    Stream* stream = File::open(path.c_str(), File::READ, true);
+    ASSERT_NE(stream, nullptr);
+    Port::StringBase<char> line;
+    ASSERT_EQ(stream->readline(line), 10);
+    std::string seen = line.str() + "\r\n";
+    const char* data = nullptr;
+    for (std::size_t size = stream->readblock(data); size > 0; size = stream->readblock(data)) {
+        ASSERT_NE(data, nullptr);
+        seen.append(data, size);
+    }
+    EXPECT_EQ(data, nullptr);
+    EXPECT_EQ(seen, content);
+    EXPECT_TRUE(stream->geteof());
+    EXPECT_EQ(stream->readblock(data), 0u);
+    EXPECT_TRUE(File::close(stream));
+
+    Stream* writer = File::open(dir.join("out.txt").c_str(), File::WRITE, true);
+    ASSERT_NE(writer, nullptr);
+    EXPECT_EQ(writer->readblock(data), 0u);
+    EXPECT_TRUE(File::close(writer));
+}
+
 TEST(PortFile, OpenRefusesWhatCannotBeRead) {
     tesutest::TempDir tmp;
     const std::string file = tmp.write("f.txt", "x\n");

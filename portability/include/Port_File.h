@@ -30,6 +30,13 @@ class PORT_API Stream {
     // then empty).
     std::int64_t readline(StringBase<char>& line);
     std::int64_t readline(StringBase<char>* line) { return readline(*line); }
+    // Lends the next bytes of the file without copying them: sets `data` to the bytes the
+    // stream holds (reading more first when it holds none) and returns how many there are;
+    // they count as read. Returns 0 (and sets `data` to null) at the end of the file, after a
+    // read error, or on a stream opened for writing. The bytes stay valid until the next read
+    // of any kind on the stream. Mixing it with readline is allowed: each sees the bytes the
+    // other has not taken.
+    std::size_t readblock(const char*& data);
     // True when nothing more can be read: at the end of the file, after a read error, or on
     // a stream opened for writing. A file that ends in a line break has no extra empty line.
     bool geteof();

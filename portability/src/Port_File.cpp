@@ -151,6 +151,18 @@ std::int64_t Stream::readline(StringBase<char>& line) {
     return gathered ? static_cast<std::int64_t>(line.GetLength()) : -1;
 }
 
+std::size_t Stream::readblock(const char*& data) {
+    data = nullptr;
+    Impl& s = *impl_;
+    if (s.writable || (s.begin == s.end && !s.fill())) {
+        return 0;
+    }
+    data = s.buffer.get() + s.begin;
+    const std::size_t size = s.end - s.begin;
+    s.begin = s.end;
+    return size;
+}
+
 bool Stream::geteof() {
     if (impl_->writable) {
         return true;
