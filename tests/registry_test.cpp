@@ -5,8 +5,10 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <atomic>
 #include <memory>
 #include <string>
+#include <thread>
 #include <vector>
 
 #include "TestSupport.h"
@@ -162,6 +164,46 @@ TEST_F(RegistryTest, PointersSurviveTheTableGrowing) {
         expected += "DEBUG[" + names[i] + "] - x\n";
     }
     EXPECT_EQ(capture.text(), expected);
+}
+
+}  // namespace
+
+namespace {
+
+// The Java bridge asks for "javavm" on whatever thread calls it: first requests of the same
+// names on several threads at once must agree on one logger per name, and lose none.
+TEST_F(RegistryTest, FirstRequestsOnSeveralThreadsAgree) {
+    constexpr int kThreads = 4;
+    constexpr int kNames = 2000;
+    std::vector<std::string> names;
+    for (int i = 0; i < kNames; ++i) {
+        names.push_back(FreshName("threaded"));
+    }
+    std::vector<std::vector<DebugMessenger*>> seen(kThreads);
+    std::vector<std::thread> threads;
+    std::atomic<int> ready{0};
+    for (int t = 0; t < kThreads; ++t) {
+        threads.emplace_back([&, t] {
+            // Start together, so that first requests of a name really overlap.
+            ready.fetch_add(1);
+            while (ready.load() < kThreads) {
+            }
+            for (const std::string& name : names) {
+                seen[t].push_back(DebugMessengerFactory::GetLogger(Port::StringBase<char>(name)));
+            }
+        });
+    }
+    for (std::thread& thread : threads) {
+        thread.join();
+    }
+    const std::unique_ptr<Names> active = ActiveLoggers();
+    for (int i = 0; i < kNames; ++i) {
+        for (int t = 1; t < kThreads; ++t) {
+            EXPECT_EQ(seen[0][i], seen[t][i]) << names[i];
+        }
+        EXPECT_EQ(seen[0][i], DebugMessengerFactory::GetLogger(Port::StringBase<char>(names[i])));
+        EXPECT_EQ(1, std::count(active->begin(), active->end(), Port::StringBase<char>(names[i])));
+    }
 }
 
 }  // namespace
