@@ -1,62 +1,226 @@
 // tesutil: the command-line tool over libTesu_Utilities.
 //
-//   tesutil <command> [options]
+//   tesutil [--roots DIR[:DIR...]] [--debug LEVEL] [--diag LEVEL] <command> [arguments]
 //   tesutil --help | tesutil <command> --help
 //
-// Exit status: 0 on success, 1 when a check fails, 2 on bad usage.
+// Exit status: 0 on success, 1 when a check fails or a thing is not found, 2 on bad usage.
 //
-// Each command is one entry of kCommands: its name, a line of summary, its usage text and the
-// function that runs it with the arguments after the command name.
-#include <chrono>
-#include <cstring>
+// This file holds the dispatch, the global options and the argument parsing; the commands
+// live in commands_*.cpp. The tool makes one Tesu::MsgMan for its lifetime, so that the
+// library's messages reach the standard error stream ("ERROR:tesutil - ...").
+#include <cstdint>
+#include <cstdlib>
+#include <exception>
+#include <filesystem>
 #include <iostream>
 #include <string>
-#include <thread>
+#include <system_error>
 #include <vector>
 
+#include "Port_Env.h"
+#include "Port_PathList.h"
 #include "Port_String.h"
 #include "Tesu_DebugMessenger.h"
 #include "Tesu_MsgMan.h"
+#include "tesutil_cli.h"
+
+#ifndef TESUTIL_SAMPLE_FROM_EXE
+#define TESUTIL_SAMPLE_FROM_EXE "../share/tesu/examples/installation"
+#endif
+
+namespace tesutil {
 
 namespace {
 
-constexpr int kExitOk = 0;
-constexpr int kExitUsage = 2;
+namespace fs = std::filesystem;
 
-using Arguments = std::vector<std::string>;
-
-struct Command {
-    const char* name;
-    const char* summary;
-    const char* usage;  // the lines after "usage: tesutil <name>"
-    int (*run)(const Arguments& arguments);
+struct GlobalOptions {
+    bool help = false;
+    bool rootsGiven = false;
+    std::string roots;
+    bool debugGiven = false;
+    Tesu::DebugMessenger::DebugLevel debug = Tesu::DebugMessenger::DEBUG_OFF;
+    Tesu::MsgMan::DiagnosticLevel diag = Tesu::MsgMan::DIAG_STANDARD;
 };
 
-// Thrown by a command for bad usage; main reports it with the command's usage.
-struct UsageError {
-    std::string message;
-};
+bool gDebugLevelGiven = false;
 
-// Reads the value of an option given as "--name value" or "--name=value" at arguments[index],
-// advancing index past what it used. False when arguments[index] is not that option.
-bool OptionValue(const Arguments& arguments, std::size_t& index, const std::string& option,
-                 std::string& value) {
-    const std::string& argument = arguments[index];
-    if (argument == option) {
-        if (index + 1 >= arguments.size()) {
-            throw UsageError{"option " + option + " needs a value"};
-        }
-        value = arguments[index + 1];
-        index += 2;
-        return true;
+Tesu::MsgMan::DiagnosticLevel ParseDiagLevel(const std::string& text) {
+    if (text == "silent") {
+        return Tesu::MsgMan::DIAG_SILENT;
     }
-    if (argument.compare(0, option.size() + 1, option + "=") == 0) {
-        value = argument.substr(option.size() + 1);
-        index += 1;
-        return true;
+    if (text == "reduced") {
+        return Tesu::MsgMan::DIAG_REDUCED;
+    }
+    if (text == "standard") {
+        return Tesu::MsgMan::DIAG_STANDARD;
+    }
+    if (text == "full") {
+        return Tesu::MsgMan::DIAG_FULL;
+    }
+    throw UsageError{"unknown diagnostic level '" + text + "' (silent, reduced, standard, full)"};
+}
+
+// Reads the global options in front of the command; returns the index of the command name
+// (arguments.size() when there is none).
+std::size_t ParseGlobalOptions(const Arguments& arguments, GlobalOptions& options) {
+    std::size_t index = 0;
+    while (index < arguments.size()) {
+        const std::string& argument = arguments[index];
+        if (argument == "--help" || argument == "-h") {
+            options.help = true;
+            ++index;
+            continue;
+        }
+        if (argument.size() < 2 || argument[0] != '-') {
+            break;  // the command
+        }
+        std::string name = argument;
+        std::string value;
+        bool hasValue = false;
+        const std::size_t equals = argument.find('=');
+        if (equals != std::string::npos) {
+            name = argument.substr(0, equals);
+            value = argument.substr(equals + 1);
+            hasValue = true;
+        }
+        if (name != "--roots" && name != "--debug" && name != "--diag") {
+            throw UsageError{"unknown option '" + argument + "'"};
+        }
+        if (!hasValue) {
+            if (index + 1 >= arguments.size()) {
+                throw UsageError{"option " + name + " needs a value"};
+            }
+            value = arguments[++index];
+        }
+        ++index;
+        if (name == "--roots") {
+            options.rootsGiven = true;
+            options.roots = value;
+        } else if (name == "--debug") {
+            options.debugGiven = true;
+            options.debug = ParseDebugLevel(value);
+        } else {
+            options.diag = ParseDiagLevel(value);
+        }
+    }
+    return index;
+}
+
+std::vector<Command> AllCommands() {
+    std::vector<Command> all;
+    for (const auto* group : {&FileCommands(), &InstallationCommands(), &DebugCommands()}) {
+        all.insert(all.end(), group->begin(), group->end());
+    }
+    return all;
+}
+
+const Command* FindCommand(const std::vector<Command>& commands, const std::string& name) {
+    for (const Command& command : commands) {
+        if (name == command.name) {
+            return &command;
+        }
+    }
+    return nullptr;
+}
+
+void PrintUsage(std::ostream& out, const std::vector<Command>& commands) {
+    out << "usage: tesutil [global options] <command> [arguments]\n"
+           "       tesutil <command> --help\n"
+           "global options (before the command):\n"
+           "  --roots DIR[:DIR...]  installation roots, in search order (\";\" between them on\n"
+           "                        Windows); default: TESSEL_ROOTS when it is set, else the\n"
+           "                        sample installation "
+        << TESUTIL_SAMPLE_FROM_EXE
+        << "\n"
+           "                        (relative to the directory of the tesutil executable)\n"
+           "  --debug LEVEL         root logger level: off (default), normal, detailed, verbose\n"
+           "  --diag LEVEL          messages on standard error: silent, reduced, standard\n"
+           "                        (default), full\n"
+           "commands:\n";
+    for (const Command& command : commands) {
+        std::string name = command.name;
+        name.resize(14, ' ');
+        out << "  " << name << command.summary << '\n';
+    }
+    out << "exit status: 0 success, 1 a check failed or a thing was not found, 2 bad usage\n";
+}
+
+void PrintCommandUsage(std::ostream& out, const Command& command) {
+    out << "usage: tesutil " << command.name << ' ' << command.usage;
+}
+
+bool AsksForHelp(const Arguments& arguments) {
+    for (const std::string& argument : arguments) {
+        if (argument == "--") {
+            return false;
+        }
+        if (argument == "--help" || argument == "-h") {
+            return true;
+        }
     }
     return false;
 }
+
+// The tool's own executable, absolute; empty when it cannot be found.
+fs::path ExecutablePath(const char* argv0) {
+    std::error_code error;
+    fs::path self = fs::read_symlink("/proc/self/exe", error);
+    if (!error && !self.empty()) {
+        return self;
+    }
+    const fs::path given = argv0 != nullptr ? fs::path(argv0) : fs::path();
+    if (given.empty()) {
+        return {};
+    }
+    if (given.has_parent_path()) {
+        return fs::absolute(given, error);
+    }
+    // Started through the search path.
+    Port::StringBase<char> searchPath;
+    if (!Port_Env::GetVariable("PATH", searchPath)) {
+        return {};
+    }
+    const Port::PathList directories(searchPath, Port::QuarnelPath::GetListSeparator());
+    for (const auto& directory : directories) {
+        const fs::path candidate = fs::path(directory.str()) / given;
+        if (fs::is_regular_file(candidate, error)) {
+            return fs::absolute(candidate, error);
+        }
+    }
+    return {};
+}
+
+// The installation roots: --roots when given, else TESSEL_ROOTS (the layer reads it), else
+// the sample installation beside the executable. When the sample is not there either, the
+// layer's own default stays (the installation prefix of the libraries).
+void SetInstallationRoots(const GlobalOptions& options, const char* argv0) {
+    const char separator = Port::QuarnelPath::GetListSeparator();
+    if (options.rootsGiven) {
+        Port::QuarnelPath::SetRoots(Port::PathList(options.roots, separator));
+        return;
+    }
+    Port::StringBase<char> fromEnvironment;
+    if (Port_Env::GetVariable("TESSEL_ROOTS", fromEnvironment)) {
+        return;
+    }
+    const fs::path executable = ExecutablePath(argv0);
+    if (executable.empty()) {
+        return;
+    }
+    std::error_code error;
+    const fs::path sample = (executable.parent_path() / TESUTIL_SAMPLE_FROM_EXE).lexically_normal();
+    if (fs::is_directory(sample, error)) {
+        // In the build tree the sample is a link to the source tree's copy: show the real
+        // place in the paths the commands print.
+        fs::path real = fs::canonical(sample, error);
+        Port::PathList roots;
+        roots.Append(error ? sample.string() : real.string());
+        Port::QuarnelPath::SetRoots(roots);
+    }
+}
+
+}  // namespace
 
 Tesu::DebugMessenger::DebugLevel ParseDebugLevel(const std::string& text) {
     if (text == "off") {
@@ -74,130 +238,131 @@ Tesu::DebugMessenger::DebugLevel ParseDebugLevel(const std::string& text) {
     throw UsageError{"unknown debug level '" + text + "' (off, normal, detailed, verbose)"};
 }
 
-// --- debug-demo ----------------------------------------------------------------------------
+bool GlobalDebugLevelGiven() {
+    return gDebugLevelGiven;
+}
 
-int RunDebugDemo(const Arguments& arguments) {
-    std::string levelName = "normal";
-    auto rootLevel = Tesu::DebugMessenger::DEBUG_NORMAL;
-    for (std::size_t index = 0; index < arguments.size();) {
+ParsedArguments ParseArguments(const Arguments& arguments, std::initializer_list<const char*> flags,
+                               std::initializer_list<const char*> valueOptions) {
+    auto known = [](std::initializer_list<const char*> names, const std::string& name) {
+        for (const char* candidate : names) {
+            if (name == candidate) {
+                return true;
+            }
+        }
+        return false;
+    };
+    ParsedArguments parsed;
+    bool optionsEnded = false;
+    for (std::size_t index = 0; index < arguments.size(); ++index) {
+        const std::string& argument = arguments[index];
+        if (optionsEnded || argument.size() < 2 || argument[0] != '-') {
+            parsed.operands.push_back(argument);
+            continue;
+        }
+        if (argument == "--") {
+            optionsEnded = true;
+            continue;
+        }
+        std::string name = argument;
         std::string value;
-        if (OptionValue(arguments, index, "--debug", value)) {
-            rootLevel = ParseDebugLevel(value);
-            levelName = value;
+        bool hasValue = false;
+        const std::size_t equals = argument.find('=');
+        if (argument.compare(0, 2, "--") == 0 && equals != std::string::npos) {
+            name = argument.substr(0, equals);
+            value = argument.substr(equals + 1);
+            hasValue = true;
+        }
+        if (known(flags, name)) {
+            if (hasValue) {
+                throw UsageError{"option " + name + " takes no value"};
+            }
+            parsed.flags.insert(name);
+        } else if (known(valueOptions, name)) {
+            if (!hasValue) {
+                if (index + 1 >= arguments.size()) {
+                    throw UsageError{"option " + name + " needs a value"};
+                }
+                value = arguments[++index];
+            }
+            parsed.values[name] = value;
         } else {
-            throw UsageError{"unknown option '" + arguments[index] + "'"};
+            throw UsageError{"unknown option '" + argument + "'"};
         }
     }
-
-    // Debug lines are status messages: the manager writes them to the standard error stream.
-    Tesu::MsgMan messages;
-
-    Tesu::DebugMessenger* root = Tesu::DebugMessengerFactory::GetLogger();
-    Tesu::DebugMessenger* demo = Tesu::DebugMessengerFactory::GetLogger("demo");
-    root->SetLevel(rootLevel);
-    demo->SetLevel(Tesu::DebugMessenger::DEBUG_INHERIT);
-
-    root->Normal("root logger: a normal line");
-    root->Detailed("root logger: a detailed line");
-    root->Verbose("root logger: a verbose line");
-    demo->Normal("inherits the root's level: a normal line");
-    demo->Detailed("inherits the root's level: a detailed line");
-    demo->Verbose("inherits the root's level: a verbose line");
-
-    {
-        // A logger of the demo's own, below "demo", always at verbose; it writes its total
-        // time when it goes out of scope.
-        Tesu::DebugMessenger step(demo, "demo.step");
-        step.SetLevel(Tesu::DebugMessenger::DEBUG_VERBOSE);
-        step.SetTimer("pause");
-        std::this_thread::sleep_for(std::chrono::milliseconds(25));
-        Port::StringBase<char> line("after a pause of 25 ms, timer 'pause' reads ");
-        line.Append(step.GetTimer("pause"));
-        step.Verbose(line);
-        step.StopTimer("pause");
-        line.Assign("time since this logger was made: ");
-        line.Append(step.GetTimer());
-        step.Normal(line);
-    }
-
-    std::cerr << "tesutil: root debug level " << levelName << "; named loggers in the registry:";
-    std::vector<Port::StringBase<char>>* names = Tesu::DebugMessengerFactory::GetActiveLoggers();
-    for (const auto& name : *names) {
-        std::cerr << ' ' << name.str();
-    }
-    delete names;
-    std::cerr << '\n';
-    return kExitOk;
+    return parsed;
 }
 
-// --- dispatch ------------------------------------------------------------------------------
-
-const Command kCommands[] = {
-    {"debug-demo", "write debug lines at each level and show the debug timers",
-     "[--debug off|normal|detailed|verbose]\n"
-     "  Sets the root logger to the level given (default normal), writes lines at each level\n"
-     "  through the root, a named logger and a logger of its own, and shows a timer.\n",
-     RunDebugDemo},
-};
-
-const Command* FindCommand(const std::string& name) {
-    for (const Command& command : kCommands) {
-        if (name == command.name) {
-            return &command;
-        }
+void ExpectOperands(const ParsedArguments& parsed, std::size_t least, std::size_t most,
+                    const char* names) {
+    const std::size_t count = parsed.operands.size();
+    if (count < least) {
+        throw UsageError{std::string("missing operand (expects ") + names + ")"};
     }
-    return nullptr;
-}
-
-void PrintUsage(std::ostream& out) {
-    out << "usage: tesutil <command> [options]\n"
-           "       tesutil <command> --help\n"
-           "commands:\n";
-    for (const Command& command : kCommands) {
-        out << "  " << command.name << std::string(14 - std::strlen(command.name), ' ')
-            << command.summary << '\n';
+    if (count > most) {
+        throw UsageError{"extra operand '" + parsed.operands[most] + "' (expects " + names + ")"};
     }
 }
 
-void PrintCommandUsage(std::ostream& out, const Command& command) {
-    out << "usage: tesutil " << command.name << ' ' << command.usage;
+int Fail(const char* command, const std::string& message) {
+    std::cerr << "tesutil " << command << ": " << message << std::endl;
+    return kExitFailed;
 }
 
-bool IsHelp(const std::string& argument) {
-    return argument == "--help" || argument == "-h";
-}
-
-}  // namespace
+}  // namespace tesutil
 
 int main(int argc, char** argv) {
+    using namespace tesutil;
+    // Results go out line by line, so that they keep their place among the messages on the
+    // standard error stream when both go to one terminal or file.
+    std::cout.setf(std::ios::unitbuf);
+
+    const std::vector<Command> commands = AllCommands();
     const Arguments all(argv + 1, argv + argc);
-    if (all.empty()) {
-        std::cerr << "tesutil: no command given\n";
-        PrintUsage(std::cerr);
+    GlobalOptions options;
+    std::size_t commandIndex = 0;
+    try {
+        commandIndex = ParseGlobalOptions(all, options);
+    } catch (const UsageError& error) {
+        std::cerr << "tesutil: " << error.message << "; tesutil --help shows the usage\n";
         return kExitUsage;
     }
-    if (IsHelp(all[0])) {
-        PrintUsage(std::cout);
+    if (options.help) {
+        PrintUsage(std::cout, commands);
         return kExitOk;
     }
-    const Command* command = FindCommand(all[0]);
-    if (command == nullptr) {
-        std::cerr << "tesutil: unknown command '" << all[0] << "'\n";
-        PrintUsage(std::cerr);
+    if (commandIndex >= all.size()) {
+        std::cerr << "tesutil: no command given; tesutil --help lists the commands\n";
         return kExitUsage;
     }
-    const Arguments arguments(all.begin() + 1, all.end());
-    for (const std::string& argument : arguments) {
-        if (IsHelp(argument)) {
-            PrintCommandUsage(std::cout, *command);
-            return kExitOk;
-        }
+    const Command* command = FindCommand(commands, all[commandIndex]);
+    if (command == nullptr) {
+        std::cerr << "tesutil: unknown command '" << all[commandIndex]
+                  << "'; tesutil --help lists the commands\n";
+        return kExitUsage;
     }
+    const Arguments arguments(all.begin() + static_cast<std::ptrdiff_t>(commandIndex) + 1,
+                              all.end());
+    if (AsksForHelp(arguments)) {
+        PrintCommandUsage(std::cout, *command);
+        return kExitOk;
+    }
+
     try {
+        SetInstallationRoots(options, argc > 0 ? argv[0] : nullptr);
+        if (options.debugGiven) {
+            Tesu::DebugMessengerFactory::GetLogger()->SetLevel(options.debug);
+        }
+        gDebugLevelGiven = options.debugGiven;
+        // Every message of the library reaches the standard error stream through this manager,
+        // filtered by the diagnostic level, until the tool ends.
+        Tesu::MsgMan messages(options.diag);
         return command->run(arguments);
     } catch (const UsageError& error) {
-        std::cerr << "tesutil " << command->name << ": " << error.message << '\n';
-        PrintCommandUsage(std::cerr, *command);
+        std::cerr << "tesutil " << command->name << ": " << error.message << "; tesutil "
+                  << command->name << " --help shows the usage\n";
         return kExitUsage;
+    } catch (const std::exception& error) {
+        return Fail(command->name, error.what());
     }
 }

@@ -1,0 +1,3 @@
+// Arithmetic unit of the demo design.
+module alu;
+endmodule

@@ -1,0 +1,3 @@
+// Top level of the demo design.
+module top;
+endmodule
