@@ -16,3 +16,6 @@ cmake --build "$build" -j "$jobs"
 
 echo "== Tests"
 ctest --test-dir "$build" --output-on-failure -j "$jobs"
+
+echo "== Unit tests as an unprivileged user (the file-permission cases)"
+bash scripts/test-unprivileged.sh "$(cd "$build" && pwd)"
