@@ -6,7 +6,9 @@
 #include <string>
 #include <vector>
 
+#include "Port_FileName.h"
 #include "Port_PathList.h"
+#include "TestPlatform.h"
 #include "TestSupport.h"
 
 namespace fs = std::filesystem;
@@ -39,20 +41,30 @@ class RootsVariable {
     }
     ~RootsVariable() {
         if (wasSet_) {
-            ::setenv("TESSEL_ROOTS", saved_.c_str(), 1);
+            tesutest::SetVariable("TESSEL_ROOTS", saved_.c_str());
         } else {
-            ::unsetenv("TESSEL_ROOTS");
+            tesutest::UnsetVariable("TESSEL_ROOTS");
         }
         QuarnelPath::Reset();
     }
-    // Sets the variable and makes the layer read it again.
+    // Sets the variable and makes the layer read it again. ":" in `value` stands for the
+    // platform's list separator.
     void set(const char* value) {
-        ::setenv("TESSEL_ROOTS", value, 1);
+        tesutest::SetVariable("TESSEL_ROOTS", Listed(value).c_str());
         QuarnelPath::Reset();
     }
     void unset() {
-        ::unsetenv("TESSEL_ROOTS");
+        tesutest::UnsetVariable("TESSEL_ROOTS");
         QuarnelPath::Reset();
+    }
+
+    static std::string Listed(std::string text) {
+        for (char& c : text) {
+            if (c == ':') {
+                c = QuarnelPath::GetListSeparator();
+            }
+        }
+        return text;
     }
 
   private:
@@ -80,12 +92,16 @@ TEST(PortPathList, SplitsAndLeavesOutEmptyEntries) {
 
 TEST(PortInstallationRoots, ReadFromTheEnvironmentOnFirstUse) {
     RootsVariable variable;
+#if defined(_WIN32)
+    EXPECT_EQ(QuarnelPath::GetListSeparator(), ';');
+#else
     EXPECT_EQ(QuarnelPath::GetListSeparator(), ':');
+#endif
 
     variable.set("/r1::/r2:");
     EXPECT_EQ(texts(QuarnelPath::GetInstance()), (Texts{"/r1", "/r2"}));
     // Read once: a later change of the variable counts only after Reset.
-    ::setenv("TESSEL_ROOTS", "/changed", 1);
+    tesutest::SetVariable("TESSEL_ROOTS", "/changed");
     EXPECT_EQ(texts(QuarnelPath::GetInstance()), (Texts{"/r1", "/r2"}));
     QuarnelPath::Reset();
     EXPECT_EQ(texts(QuarnelPath::GetInstance()), (Texts{"/changed"}));
@@ -123,11 +139,12 @@ TEST(PortInstallationRoots, WithoutTheVariableTheInstallationPrefix) {
     RootsVariable variable;
     variable.unset();
 
-    // The library is built in <build>/portability, so the prefix is the build directory.
+    // The library is built in <build>/portability (<build>/bin on Windows), so the prefix is
+    // the build directory.
     const std::string prefix = QuarnelPath::GetInstallationPrefix().str();
     ASSERT_FALSE(prefix.empty());
-    EXPECT_EQ(prefix.front(), '/');
-    EXPECT_NE(prefix.back(), '/');
+    EXPECT_TRUE(fs::path(prefix).is_absolute()) << prefix;
+    EXPECT_NE(prefix.back(), Port::FileName::GetPathSeparator());
     EXPECT_TRUE(fs::equivalent(prefix, TESU_BINARY_DIR)) << prefix;
     EXPECT_EQ(texts(QuarnelPath::GetInstance()), (Texts{prefix}));
 

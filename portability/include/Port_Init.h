@@ -75,6 +75,14 @@ class PORT_API InitRecorder {
     static void Note(const char* owner, const char* what, bool constructed);
 };
 
+#if defined(_WIN32)
+// For the entry (DllMain) of a DLL built on the layer: asks Windows not to tell the DLL
+// `module` (its module handle, as the entry receives it) of threads starting and ending. A
+// null handle is ignored; the system's answer is not reported (the notifications cost time,
+// nothing more).
+PORT_API void DisableThreadNotifications(void* module);
+#endif
+
 }  // namespace Port
 
 #endif

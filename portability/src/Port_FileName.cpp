@@ -1,12 +1,14 @@
 // Port::FileName: the text logic of file names.
 //
-// Everything here works on bytes and is the same on every platform except where a comment
-// says that Windows will differ: the root of an absolute name (drive letters, UNC shares)
-// and the separator the results use. The working directory and the resolution of symbolic
-// links come from the operating-system interface (Port_OS.h).
+// Everything here works on bytes and is the same on every platform except the root of an
+// absolute name (drive letters and UNC shares on Windows), the completion of the names that
+// Windows roots on a drive without naming its directory, and the separator the results use.
+// The working directory and the resolution of symbolic links come from the operating-system
+// interface (Port_OS.h).
 #include "Port_FileName.h"
 
 #include <cstring>
+#include <stdexcept>
 #include <string>
 #include <utility>
 #include <vector>
@@ -32,25 +34,72 @@ std::string toNative(std::string text) {
     return text;
 }
 
-// True when `text` names a location without help from the working directory.
-// On POSIX that is a name beginning with a separator. Windows will differ: "C:\..." and UNC
-// names ("\\server\share\...") are absolute; "\..." is rooted on the current drive and
-// "C:..." is relative to the working directory of drive C, and both need that drive's
-// working directory to be completed.
+#if defined(_WIN32)
+bool hasDrive(const std::string& text) {
+    const char c = text.size() >= 2 ? text[0] : '\0';
+    return ((c >= 'A' && c <= 'Z') || (c >= 'a' && c <= 'z')) && text[1] == ':';
+}
+
+// "\\server\share...": two separators, then a name.
+bool isUnc(const std::string& text) {
+    return text.size() >= 3 && isSeparator(text[0]) && isSeparator(text[1]) &&
+           !isSeparator(text[2]);
+}
+
+// Index of the first separator at or after `from`, or the length.
+std::size_t nextSeparator(const std::string& text, std::size_t from) {
+    while (from < text.size() && !isSeparator(text[from])) {
+        ++from;
+    }
+    return from;
+}
+#endif
+
+// True when `text` names a location without help from the working directory: on POSIX a
+// name beginning with a separator; on Windows a drive with its root ("C:\...") or a UNC name
+// ("\\server\share\..."). There "\..." is rooted on the working directory's drive and "C:..."
+// is relative to the working directory of drive C, and both need completing.
 bool isAbsolute(const std::string& text) {
+#if defined(_WIN32)
+    return (hasDrive(text) && text.size() >= 3 && isSeparator(text[2])) || isUnc(text);
+#else
     return !text.empty() && isSeparator(text[0]);
+#endif
 }
 
 // Number of leading characters of an absolute `text` that make up its root, and the root as
 // the result writes it. On POSIX the root is "/" and every leading separator belongs to it
-// ("//x" is "/x"). Windows will differ: the root is the drive ("C:\") or the share
-// ("\\server\share\"), and ".." must not climb out of it.
+// ("//x" is "/x"). On Windows the root is the drive ("C:\") or the share ("\\server\share\"),
+// with the separators that follow it; ".." cannot climb out of it.
 std::size_t rootLength(const std::string& text, std::string& root) {
     std::size_t length = 0;
+#if defined(_WIN32)
+    if (isUnc(text)) {
+        const std::size_t serverEnd = nextSeparator(text, 2);
+        std::size_t shareStart = serverEnd;
+        while (shareStart < text.size() && isSeparator(text[shareStart])) {
+            ++shareStart;
+        }
+        const std::size_t shareEnd = nextSeparator(text, shareStart);
+        root = "\\\\";
+        root.append(text, 2, serverEnd - 2);
+        root += os::kPathSeparator;
+        if (shareEnd > shareStart) {
+            root.append(text, shareStart, shareEnd - shareStart);
+            root += os::kPathSeparator;
+        }
+        length = shareEnd;
+    } else {
+        root.assign(text, 0, 2);
+        root += os::kPathSeparator;
+        length = 2;
+    }
+#else
+    root.assign(1, os::kPathSeparator);
+#endif
     while (length < text.size() && isSeparator(text[length])) {
         ++length;
     }
-    root.assign(1, os::kPathSeparator);
     return length;
 }
 
@@ -98,6 +147,25 @@ std::string completed(const std::string& text) {
     if (isAbsolute(text)) {
         return text;
     }
+#if defined(_WIN32)
+    if (hasDrive(text)) {
+        // "D:x": relative to the working directory of drive D.
+        std::string directory;
+        std::string reason;
+        if (!os::driveDirectory(text[0], directory, reason)) {
+            throw std::runtime_error("cannot read the working directory of drive " +
+                                     text.substr(0, 2) + ": " + reason);
+        }
+        return directory + os::kPathSeparator + text.substr(2);
+    }
+    if (!text.empty() && isSeparator(text[0])) {
+        // "\x": rooted on the working directory's drive (or share).
+        const std::string directory = File::getcwd().str();
+        std::string root;
+        rootLength(directory, root);
+        return root + text;
+    }
+#endif
     std::string full = File::getcwd().str();
     full += os::kPathSeparator;
     full += text;

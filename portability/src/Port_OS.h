@@ -68,6 +68,11 @@ bool realPath(const std::string& name, std::string& resolved);
 // removed). `reason` then says why.
 bool currentDirectory(std::string& directory, std::string& reason);
 bool changeDirectory(const std::string& directory);
+#if defined(_WIN32)
+// The working directory of drive `drive` (a letter), which completes a drive-relative name
+// such as "D:x"; false when it cannot be read. `reason` then says why.
+bool driveDirectory(char drive, std::string& directory, std::string& reason);
+#endif
 
 // One entry of a directory: its final name and what it denotes (links followed).
 struct DirEntry {

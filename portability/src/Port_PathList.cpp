@@ -41,10 +41,12 @@ Roots& roots() {
     return *instance;
 }
 
-// The directory part of `path` without its final separator (the root keeps it).
+// The directory part of `path` without its final separator (the root keeps it: "/", and on
+// Windows "C:\", whose separator makes it the root rather than drive C's working directory).
 std::string parentOf(const std::string& path) {
     std::string head = FileName(StringBase<char>(path)).GetHead().str();
-    if (head.size() > 1 && FileName::IsSeparator(head.back())) {
+    const bool driveRoot = os::kPathSeparator == '\\' && head.size() == 3 && head[1] == ':';
+    if (head.size() > 1 && FileName::IsSeparator(head.back()) && !driveRoot) {
         head.pop_back();
     }
     return head;
