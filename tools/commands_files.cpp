@@ -106,19 +106,21 @@ bool ReadBytes(const fs::path& path, std::string& bytes) {
     return true;
 }
 
-// A name for a temporary file beside `target` that does not exist yet.
+// A name for a temporary file beside `target` that does not exist yet; empty when none is
+// found (the tool never writes over a file that is there).
 fs::path TemporaryBeside(const fs::path& target) {
     std::random_device random;
     std::error_code error;
-    for (int attempt = 0;; ++attempt) {
+    for (int attempt = 0; attempt < 100; ++attempt) {
         std::ostringstream name;
         name << '.' << target.filename().string() << ".tesutil-" << std::hex << random() << random()
              << ".tmp";
         fs::path candidate = target.parent_path() / name.str();
-        if (!fs::exists(candidate, error) || attempt >= 100) {
+        if (!fs::exists(fs::symlink_status(candidate, error))) {
             return candidate;
         }
     }
+    return fs::path();
 }
 
 // Replaces `target` by `bytes` through a temporary file beside it, which gets the target's
@@ -126,6 +128,9 @@ fs::path TemporaryBeside(const fs::path& target) {
 // or the empty text.
 std::string ReplaceAtomically(const fs::path& target, const std::string& bytes) {
     const fs::path temporary = TemporaryBeside(target);
+    if (temporary.empty()) {
+        return "cannot find a free name for a temporary file beside it";
+    }
     std::error_code error;
     auto failed = [&](const std::string& what) {
         fs::remove(temporary, error);
