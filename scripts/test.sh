@@ -19,3 +19,4 @@ ctest --test-dir "$build" --output-on-failure -j "$jobs"
 
 echo "== Unit tests as an unprivileged user (the file-permission cases)"
 bash scripts/test-unprivileged.sh "$(cd "$build" && pwd)"
+bash scripts/ci-windows.sh

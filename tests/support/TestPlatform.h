@@ -17,13 +17,29 @@
 
 namespace tesutest {
 
+#if defined(_WIN32)
+// UTF-8 to UTF-16, as the layer reads texts on Windows.
+inline std::wstring Wide(const std::string& text) {
+    if (text.empty()) {
+        return std::wstring();
+    }
+    const int length = static_cast<int>(text.size());
+    std::wstring wide(static_cast<std::size_t>(
+                          ::MultiByteToWideChar(CP_UTF8, 0, text.data(), length, nullptr, 0)),
+                      L'\0');
+    ::MultiByteToWideChar(CP_UTF8, 0, text.data(), length, &wide[0], static_cast<int>(wide.size()));
+    return wide;
+}
+#endif
+
 // Sets an environment variable of this process (the empty text is a value, not an unset).
+// Texts are UTF-8.
 inline void SetVariable(const char* name, const char* value) {
 #if defined(_WIN32)
     // The C runtime's copy first (it removes a variable set to the empty text, from the
     // process environment too), then the process environment, which the layer reads.
-    ::_putenv_s(name, value);
-    ::SetEnvironmentVariableA(name, value);
+    ::_wputenv_s(Wide(name).c_str(), Wide(value).c_str());
+    ::SetEnvironmentVariableW(Wide(name).c_str(), Wide(value).c_str());
 #else
     ::setenv(name, value, 1);
 #endif
@@ -31,9 +47,9 @@ inline void SetVariable(const char* name, const char* value) {
 
 inline void UnsetVariable(const char* name) {
 #if defined(_WIN32)
-    ::SetEnvironmentVariableA(name, nullptr);
+    ::SetEnvironmentVariableW(Wide(name).c_str(), nullptr);
     // "NAME=" removes the C runtime's copy.
-    ::_putenv((std::string(name) + "=").c_str());
+    ::_wputenv((Wide(name) + L"=").c_str());
 #else
     ::unsetenv(name);
 #endif
