@@ -56,7 +56,9 @@ run relpath examples/installation
 
 echo
 echo "== The Java message demo"
-if cmake --build "$build" --target help 2>/dev/null | grep -q '^java-demo:'; then
+# (The list of targets is taken whole first: grep -q stopping early would break the pipe.)
+targets=$(cmake --build "$build" --target help 2>/dev/null || true)
+if grep -q '^java-demo:' <<<"$targets"; then
   cmake --build "$build" --target java-demo
 else
   echo "(not built: CMake found no JDK)"
