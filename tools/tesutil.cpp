@@ -213,7 +213,7 @@ void SetInstallationRoots(const GlobalOptions& options, const char* argv0) {
     if (fs::is_directory(sample, error)) {
         // In the build tree the sample is a link to the source tree's copy: show the real
         // place in the paths the commands print.
-        fs::path real = fs::canonical(sample, error);
+        const fs::path real = fs::canonical(sample, error);
         Port::PathList roots;
         roots.Append(error ? sample.string() : real.string());
         Port::QuarnelPath::SetRoots(roots);
