@@ -101,7 +101,9 @@ class TESU_API DebugMessenger {
 // The registry of shared loggers: one root, made at library load, and one child of the root
 // per other name, made on its first request. The registry owns them all and frees none, so
 // every pointer it hands out stays valid until the process ends; callers never delete them.
-// Nothing is locked: callers serialise their use of the registry and of its loggers.
+// Lookups and the listing hold a lock of the registry's own, so that first requests on several
+// threads (the Java bridge's, for one) are safe; the loggers handed out lock nothing, and their
+// users serialise the calls that change them (levels, timers).
 class TESU_API DebugMessengerFactory {
   public:
     DebugMessengerFactory() = delete;
