@@ -80,7 +80,7 @@ TEST(PortStream, LineEnds) {
     EXPECT_EQ(readLines(tmp.write("double-cr", "a\r\r\n")), (Lines{"a\r"}));
     EXPECT_EQ(readLines(tmp.write("only-cr", "\r")), (Lines{"\r"}));
     const std::string withNul("a\0b\n\0\r\n\0", 8);
-    EXPECT_EQ(readLines(tmp.write("nul", withNul)),
+    EXPECT_EQ(readLines(tmp.write("with-nul", withNul)),
               (Lines{std::string("a\0b", 3), std::string("\0", 1), std::string("\0", 1)}));
 }
 
@@ -289,13 +289,20 @@ TEST(PortFile, WriteFailuresAreReported) {
 
 TEST(PortFile, NamesAreJustBytes) {
     tesutest::TempDir tmp;
-    for (const std::string name : {"with blanks.txt", "caf\xc3\xa9\xff.v", "%n%s%x.txt"}) {
+#if defined(_WIN32)
+    // Windows holds names in UTF-16: bytes that are not UTF-8 name nothing there
+    // (port_windows_test checks that they are refused).
+    const char* const odd = "caf\xc3\xa9.v";
+#else
+    const char* const odd = "caf\xc3\xa9\xff.v";
+#endif
+    for (const std::string name : {"with blanks.txt", odd, "%n%s%x.txt"}) {
         const std::string path = tmp.join(name);
         Stream* out = File::open(path.c_str(), File::WRITE, true);
         ASSERT_NE(out, nullptr) << name;
         EXPECT_TRUE(out->write(name.c_str()));
         EXPECT_TRUE(File::close(out));
-        EXPECT_TRUE(fs::exists(fs::path(tmp.path()) / name)) << name;
+        EXPECT_TRUE(fs::exists(fs::path(tmp.path()) / fs::u8path(name))) << name;
         EXPECT_TRUE(File::isfile(path.c_str()));
         EXPECT_EQ(readLines(path), (Lines{name}));
     }
@@ -363,6 +370,10 @@ TEST(PortFile, CanreadFollowsPermissions) {
 }
 
 TEST(PortFile, WorkingDirectory) {
+#if defined(_WIN32)
+    GTEST_SKIP() << "POSIX root and a removable working directory; "
+                    "WindowsFile.WorkingDirectoryOnADrive covers Windows";
+#endif
     tesutest::WorkingDirectoryRestorer restore;
     tesutest::TempDir tmp;
     const std::string target = fs::canonical(tmp.mkdir("a b")).string();

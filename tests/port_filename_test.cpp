@@ -30,7 +30,7 @@ TEST(PortFileName, SplitsAfterTheLastSeparatorOfEitherKind) {
     FileName mixed("a/b\\c.txt");
     EXPECT_EQ(text(mixed.GetHead()), "a/b\\");
     EXPECT_EQ(text(mixed.GetTail()), "c.txt");
-    EXPECT_EQ(text(mixed.GetHead(true)), "a/b/");
+    EXPECT_EQ(text(mixed.GetHead(true)), tesutest::Native("a/b/"));
 
     FileName bare("file.v");
     EXPECT_EQ(text(bare.GetHead()), "");
@@ -50,6 +50,10 @@ TEST(PortFileName, SplitsAfterTheLastSeparatorOfEitherKind) {
 }
 
 TEST(PortFileName, JoinsPartsWithExactlyOneSeparator) {
+#if defined(_WIN32)
+    GTEST_SKIP() << "expects POSIX texts (\"/\" joins, \"/\" is the root); the WindowsFileName "
+                    "tests check the Windows forms";
+#endif
     FileName java;
     java.SetHead("/opt/inst");
     java.SetTail("/java/linux-x86_64/jre/bin/java");
@@ -93,6 +97,10 @@ TEST(PortFileName, JoinsPartsWithExactlyOneSeparator) {
 }
 
 TEST(PortFileName, NativeFormTurnsBothSeparatorsIntoThePlatforms) {
+#if defined(_WIN32)
+    GTEST_SKIP() << "expects POSIX texts (\"/\" joins, \"/\" is the root); the WindowsFileName "
+                    "tests check the Windows forms";
+#endif
     const char separator = FileName::GetPathSeparator();
     EXPECT_EQ(separator, '/');
     EXPECT_EQ(text(FileName("a\\b/c\\").MakeNative()), "a/b/c/");
@@ -100,6 +108,10 @@ TEST(PortFileName, NativeFormTurnsBothSeparatorsIntoThePlatforms) {
 }
 
 TEST(PortFileName, AbsoluteFormResolvesDotsAndSeparatorsLexically) {
+#if defined(_WIN32)
+    GTEST_SKIP() << "expects POSIX texts (\"/\" joins, \"/\" is the root); the WindowsFileName "
+                    "tests check the Windows forms";
+#endif
     tesutest::WorkingDirectoryRestorer restore;
     tesutest::TempDir tmp;
     tmp.mkdir("w/sub");
@@ -140,6 +152,10 @@ TEST(PortFileName, AbsoluteFormResolvesDotsAndSeparatorsLexically) {
 }
 
 TEST(PortFileName, HeadOfTheAbsoluteForm) {
+#if defined(_WIN32)
+    GTEST_SKIP() << "expects POSIX texts (\"/\" joins, \"/\" is the root); the WindowsFileName "
+                    "tests check the Windows forms";
+#endif
     tesutest::WorkingDirectoryRestorer restore;
     tesutest::TempDir tmp;
     const std::string cwd = enter(tmp.path());

@@ -7,6 +7,7 @@
 #include <string>
 
 #include "Port_Env.h"
+#include "TestPlatform.h"
 #include "TestSupport.h"
 #include "Tesu_DebugMessenger.h"
 #include "Tesu_Utilities.h"
@@ -65,17 +66,17 @@ TEST_F(SearchTest, FirstRootInListOrderWins) {
     {
         tesutest::RootsGuard roots(rootList({t + "/none", t + "/r1", t + "/r2"}));
         EXPECT_TRUE(search(false, "lib/a.txt", out));
-        EXPECT_EQ(out, t + "/r1/lib/a.txt");
+        EXPECT_EQ(out, tesutest::Native(t + "/r1/lib/a.txt"));
         EXPECT_EQ(capture.text(), found("lib/a.txt", out));
         EXPECT_TRUE(search(false, "lib/only2.txt", out));
-        EXPECT_EQ(out, t + "/r2/lib/only2.txt");
+        EXPECT_EQ(out, tesutest::Native(t + "/r2/lib/only2.txt"));
         // A directory is found like a file; a leading separator is not doubled.
         EXPECT_TRUE(search(false, "\\lib/somedir/", out));
-        EXPECT_EQ(out, t + "/r2/lib/somedir");
+        EXPECT_EQ(out, tesutest::Native(t + "/r2/lib/somedir"));
     }
     tesutest::RootsGuard roots(rootList({t + "/r2/", t + "/r1"}));
     EXPECT_TRUE(search(false, "lib/a.txt", out));
-    EXPECT_EQ(out, t + "/r2/lib/a.txt");
+    EXPECT_EQ(out, tesutest::Native(t + "/r2/lib/a.txt"));
 }
 
 TEST_F(SearchTest, FailureLeavesOutputUntouchedAndTracesOneLine) {
@@ -101,11 +102,16 @@ TEST_F(SearchTest, EmptyNameGivesFirstExistingRootAndRelativeRootsBecomeAbsolute
     tesutest::RootsGuard roots(rootList({"none", "./r2/"}));
     std::string out;
     EXPECT_TRUE(search(false, "", out));
-    EXPECT_EQ(out, fs::current_path().string() + "/r2");
+    EXPECT_EQ(out, tesutest::Native(fs::current_path().string() + "/r2"));
 }
 
 TEST_F(SearchTest, TracesOnlyAtVerboseLevelAndNamesAreNeverFormats) {
+#if defined(_WIN32)
+    // Windows names are UTF-16: the bytes must be UTF-8 to name a file there.
+    const std::string name = "d\xc3\xa9j\xc3\xa0 %s%n.txt";
+#else
     const std::string name = "d\xc3\xa9j\xe0 %s%n.txt";
+#endif
     temp.write("r1/" + name, "");
     tesutest::RootsGuard roots(rootList({t + "/r1"}));
     std::string out;
@@ -118,7 +124,7 @@ TEST_F(SearchTest, TracesOnlyAtVerboseLevelAndNamesAreNeverFormats) {
         ->SetLevel(Tesu::DebugMessenger::DEBUG_INHERIT);
     Tesu::DebugMessengerFactory::GetLogger()->SetLevel(Tesu::DebugMessenger::DEBUG_VERBOSE);
     EXPECT_TRUE(search(false, name, out));
-    EXPECT_EQ(capture.text(), found(name, t + "/r1/" + name));
+    EXPECT_EQ(capture.text(), found(name, tesutest::Native(t + "/r1/") + name));
 }
 
 TEST_F(SearchTest, ContainerEntriesAreSearchedInNameOrder) {
@@ -131,12 +137,12 @@ TEST_F(SearchTest, ContainerEntriesAreSearchedInNameOrder) {
     tesutest::RootsGuard roots(rootList({t + "/r1"}));
     std::string out;
     EXPECT_TRUE(search(true, "only_b.v", out));
-    EXPECT_EQ(out, t + "/" + c1 + "B/only_b.v");
+    EXPECT_EQ(out, tesutest::Native(t + "/" + c1 + "B/only_b.v"));
     EXPECT_EQ(capture.text(), found("only_b.v", out));
     EXPECT_TRUE(search(true, "both.v", out));
-    EXPECT_EQ(out, t + "/" + c1 + "A/both.v");
+    EXPECT_EQ(out, tesutest::Native(t + "/" + c1 + "A/both.v"));
     EXPECT_TRUE(search(true, "sub", out));
-    EXPECT_EQ(out, t + "/" + c1 + "A/sub");
+    EXPECT_EQ(out, tesutest::Native(t + "/" + c1 + "A/sub"));
     // Neither the container itself nor the root is searched.
     capture.clear();
     EXPECT_FALSE(search(true, "direct.v", out));
@@ -152,18 +158,18 @@ TEST_F(SearchTest, ContainerRootsAreWalkedInOrder) {
     tesutest::RootsGuard roots(rootList({t + "/r0", t + "/r1", t + "/r2", t + "/r3", t + "/r4"}));
     std::string out;
     EXPECT_TRUE(search(true, "core.v", out));
-    EXPECT_EQ(out, t + "/r3/tessel/ip/quarnel/Z/core.v");
+    EXPECT_EQ(out, tesutest::Native(t + "/r3/tessel/ip/quarnel/Z/core.v"));
 }
 
 TEST_F(SearchTest, JavaRuntimeIsFoundUnderTheRootsByPlatformName) {
-    if (Port_Env::IsNt()) {
-        GTEST_SKIP() << "the names below are those of a platform without \".exe\"";
-    }
+    // On Windows NT the runtime is "java.exe"; elsewhere "java", and a "java.exe" is not it.
     const std::string platform = Port_Env::GetPlatformPath().str();
-    const std::string name = "/java/" + platform + "/jre/bin/java";
-    temp.write("r1/java/" + platform + "/jre/bin/java.exe", "");
-    temp.write("r2/java/" + platform + "/jre/bin/java", "");
-    temp.write("r3/java/" + platform + "/jre/bin/java", "");
+    const std::string exe = Port_Env::IsNt() ? ".exe" : "";
+    const std::string other = Port_Env::IsNt() ? "" : ".exe";
+    const std::string name = tesutest::Native("/java/" + platform + "/jre/bin/java") + exe;
+    temp.write("r1/java/" + platform + "/jre/bin/java" + other, "");
+    temp.write("r2/java/" + platform + "/jre/bin/java" + exe, "");
+    temp.write("r3/java/" + platform + "/jre/bin/java" + exe, "");
     Text out("untouched");
     {
         tesutest::RootsGuard roots(rootList({t + "/r1"}));
@@ -174,7 +180,7 @@ TEST_F(SearchTest, JavaRuntimeIsFoundUnderTheRootsByPlatformName) {
     capture.clear();
     tesutest::RootsGuard roots(rootList({t + "/r1", t + "/r2", t + "/r3"}));
     EXPECT_TRUE(Utilities::GetJavaExecutablePath(out));
-    EXPECT_EQ(out.str(), t + "/r2" + name);
+    EXPECT_EQ(out.str(), tesutest::Native(t + "/r2") + name);
     EXPECT_EQ(capture.text(), found(name, out.str()));
 }
 

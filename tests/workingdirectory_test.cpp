@@ -9,6 +9,7 @@
 #include <streambuf>
 #include <string>
 
+#include "TestPlatform.h"
 #include "TestSupport.h"
 #include "Tesu_DebugMessenger.h"
 #include "Tesu_MsgMan.h"
@@ -20,16 +21,20 @@ namespace fs = std::filesystem;
 using Guard = Tesu::SetWorkingDirectory;
 
 std::string setTrace(const std::string& dir) {
-    return "DEBUG[utilities] - Current working directory set to " + dir + "/\n";
+    return "DEBUG[utilities] - Current working directory set to " + tesutest::Native(dir + "/") +
+           "\n";
 }
 std::string revertTrace(const std::string& dir) {
-    return "DEBUG[utilities] - Current working directory reverted to " + dir + "/\n";
+    return "DEBUG[utilities] - Current working directory reverted to " +
+           tesutest::Native(dir + "/") + "\n";
 }
 std::string reconfirmTrace(const std::string& dir) {
-    return "DEBUG[utilities] - Reconfirming current working directory from " + dir + "/\n";
+    return "DEBUG[utilities] - Reconfirming current working directory from " +
+           tesutest::Native(dir + "/") + "\n";
 }
 std::string error(const std::string& what, const std::string& dir) {
-    return "ERROR:tesutil - Unable to " + what + " working directory to " + dir + "/\n";
+    return "ERROR:tesutil - Unable to " + what + " working directory to " +
+           tesutest::Native(dir + "/") + "\n";
 }
 
 // A stream buffer that fails every write once armed.
@@ -58,7 +63,8 @@ class FailingBuffer : public std::streambuf {
 // Starts every test in <temp>/start with the logger "utilities" at verbose level.
 class WorkingDirectoryTest : public ::testing::Test {
   protected:
-    WorkingDirectoryTest() : t(fs::canonical(temp.path()).string()), start(t + "/start") {
+    WorkingDirectoryTest()
+        : t(fs::canonical(temp.path()).string()), start(tesutest::Native(t + "/start")) {
         fs::create_directory(start);
         fs::create_directory(t + "/d");
         fs::current_path(start);
@@ -81,7 +87,7 @@ TEST_F(WorkingDirectoryTest, ChangesForItsLifetimeAndBack) {
         capture.clear();
         {
             Guard guard(arg);
-            EXPECT_EQ(cwd(), t + "/d") << arg;
+            EXPECT_EQ(cwd(), tesutest::Native(t + "/d")) << arg;
         }
         EXPECT_EQ(cwd(), start);
         EXPECT_EQ(capture.text(), setTrace(t + "/d") + revertTrace(start)) << arg;
@@ -94,7 +100,7 @@ TEST_F(WorkingDirectoryTest, FileOrMissingNameStandsForItsDirectory) {
         capture.clear();
         {
             Guard guard(arg);
-            EXPECT_EQ(cwd(), t + "/d") << arg;
+            EXPECT_EQ(cwd(), tesutest::Native(t + "/d")) << arg;
         }
         EXPECT_EQ(capture.text(), setTrace(t + "/d") + revertTrace(start)) << arg;
     }
@@ -132,7 +138,7 @@ TEST_F(WorkingDirectoryTest, NestedGuardsRestoreEachLevel) {
             Guard guard(inner);
             EXPECT_EQ(cwd(), inner);
         }
-        EXPECT_EQ(cwd(), t + "/d");
+        EXPECT_EQ(cwd(), tesutest::Native(t + "/d"));
     }
     EXPECT_EQ(cwd(), start);
     EXPECT_EQ(capture.text(),
@@ -144,7 +150,7 @@ TEST_F(WorkingDirectoryTest, VanishedPreviousDirectoryIsReportedAtRevert) {
         Guard guard(t + "/d");
         fs::remove(start);
     }
-    EXPECT_EQ(cwd(), t + "/d");
+    EXPECT_EQ(cwd(), tesutest::Native(t + "/d"));
     EXPECT_EQ(capture.text(), setTrace(t + "/d") + error("revert", start));
 }
 
@@ -159,7 +165,7 @@ TEST_F(WorkingDirectoryTest, ReconfirmReturnsToTheTargetOnlyWhenMovedAway) {
         // A directory that differs only in letter case is another directory.
         fs::current_path(t + "/case");
         guard.Reconfirm();
-        EXPECT_EQ(cwd(), t + "/Case");
+        EXPECT_EQ(cwd(), tesutest::Native(t + "/Case"));
         EXPECT_EQ(capture.text(), reconfirmTrace(t + "/case"));
         guard.Reconfirm();
         EXPECT_EQ(capture.text(), reconfirmTrace(t + "/case"));
@@ -179,7 +185,7 @@ TEST_F(WorkingDirectoryTest, ReconfirmReportsAVanishedTarget) {
     // The guard is unchanged: once the target is back, a further Reconfirm enters it.
     fs::create_directory(t + "/d");
     guard.Reconfirm();
-    EXPECT_EQ(cwd(), t + "/d");
+    EXPECT_EQ(cwd(), tesutest::Native(t + "/d"));
 }
 
 TEST_F(WorkingDirectoryTest, UnreadableWorkingDirectoryPassesTheLayersException) {

@@ -60,7 +60,8 @@ std::string TempDir::join(const std::string& relative) const {
 }
 
 std::string TempDir::write(const std::string& relative, const std::string& content) const {
-    const fs::path target = fs::path(path_) / relative;
+    // Names are UTF-8, also where the system's own narrow encoding is another (Windows).
+    const fs::path target = fs::u8path(path_) / fs::u8path(relative);
     fs::create_directories(target.parent_path());
     std::ofstream out(target, std::ios::binary | std::ios::trunc);
     out.write(content.data(), static_cast<std::streamsize>(content.size()));
@@ -71,7 +72,7 @@ std::string TempDir::write(const std::string& relative, const std::string& conte
 }
 
 std::string TempDir::mkdir(const std::string& relative) const {
-    const fs::path target = fs::path(path_) / relative;
+    const fs::path target = fs::u8path(path_) / fs::u8path(relative);
     fs::create_directories(target);
     return target.string();
 }
