@@ -136,7 +136,7 @@ TEST_F(WorkingDirectoryTest, NestedGuardsRestoreEachLevel) {
         Guard outer(t + "/d");
         {
             Guard guard(inner);
-            EXPECT_EQ(cwd(), inner);
+            EXPECT_EQ(cwd(), tesutest::Native(inner));
         }
         EXPECT_EQ(cwd(), tesutest::Native(t + "/d"));
     }
@@ -189,6 +189,9 @@ TEST_F(WorkingDirectoryTest, ReconfirmReportsAVanishedTarget) {
 }
 
 TEST_F(WorkingDirectoryTest, UnreadableWorkingDirectoryPassesTheLayersException) {
+#if defined(_WIN32)
+    GTEST_SKIP() << "Windows does not let a process remove its working directory";
+#endif
     const std::string doomed = temp.mkdir("doomed");
     Guard guard(doomed);
     fs::remove(doomed);
@@ -214,7 +217,7 @@ TEST_F(WorkingDirectoryTest, FailureWhileRevertingIsReportedAndNeverEscapes) {
     EXPECT_EQ(cwd(), start);
     EXPECT_EQ(record.str(), setTrace(t + "/d") + revertTrace(start) +
                                 "ERROR:tesutil - Exception while reverting working directory to " +
-                                start + "/\n");
+                                tesutest::Native(start + "/") + "\n");
 }
 
 }  // namespace
