@@ -1,13 +1,13 @@
 // Checksummed files: the checksum text of a body of text, and the check of real files against
 // their own "# CRC:" line.
 #include <gtest/gtest.h>
-#include <unistd.h>
 
 #include <filesystem>
 #include <string>
 #include <vector>
 
 #include "Port_String.h"
+#include "TestPlatform.h"
 #include "TestSupport.h"
 #include "Tesu_Utilities.h"
 
@@ -277,8 +277,8 @@ TEST(ValidateFileChecksum, NamesThatDoNotOpenAreReportedAsPassed) {
 }
 
 TEST(ValidateFileChecksum, UnreadableFileDoesNotOpen) {
-    if (getuid() == 0) {
-        GTEST_SKIP() << "permissions do not stop the superuser";
+    if (const char* reason = tesutest::WhyPermissionsDoNotLockOut()) {
+        GTEST_SKIP() << reason;
     }
     tesutest::TempDir dir;
     const std::string path = dir.write("locked.txt", StampLine() + kBody);

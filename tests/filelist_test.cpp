@@ -1,7 +1,6 @@
 // File lists: members read from real list files, cleaned, checked for existence and joined to
 // the list's directory; the messages and the trace line that reading issues.
 #include <gtest/gtest.h>
-#include <unistd.h>
 
 #include <filesystem>
 #include <string>
@@ -9,6 +8,7 @@
 
 #include "Port_FileName.h"
 #include "Port_String.h"
+#include "TestPlatform.h"
 #include "TestSupport.h"
 #include "Tesu_DebugMessenger.h"
 #include "Tesu_FileListMember.h"
@@ -34,6 +34,14 @@ std::vector<std::string> Names(const std::string& list) {
     return texts;
 }
 
+// The texts with the separators the layer writes (backslashes on Windows NT).
+std::vector<std::string> Natives(std::vector<std::string> texts) {
+    for (std::string& text : texts) {
+        text = tesutest::Native(text);
+    }
+    return texts;
+}
+
 class FileListTest : public ::testing::Test {
   protected:
     FileListTest() {
@@ -44,7 +52,8 @@ class FileListTest : public ::testing::Test {
         dir.mkdir("lists/ip");
     }
     std::string Missing(const std::string& relative) const {
-        return "WARNING:tesutil - Missing file list member " + dir.join(relative) + "\n";
+        return "WARNING:tesutil - Missing file list member " +
+               tesutest::Native(dir.join(relative)) + "\n";
     }
 
     tesutest::LoggerLevelsReset levels;
@@ -72,9 +81,8 @@ TEST_F(FileListTest, EveryKindOfLineIsCleanedOrSkipped) {
                                        "crlf.v\r\n"
                                        "c.v");
     tesutest::MessageCapture capture;
-    EXPECT_EQ((std::vector<std::string>{"a.v", "sub/dir/file.v", "b.v", "c.v", "sub/dir/file.v",
-                                        "sub/dir/file.v", "with blank.v", "with blank.v", "ip",
-                                        "a.v", "crlf.v", "c.v"}),
+    EXPECT_EQ(Natives({"a.v", "sub/dir/file.v", "b.v", "c.v", "sub/dir/file.v", "sub/dir/file.v",
+                       "with blank.v", "with blank.v", "ip", "a.v", "crlf.v", "c.v"}),
               Strings(list));
     // The logger is off: nothing at all is issued.
     EXPECT_EQ("", capture.text());
@@ -90,11 +98,11 @@ TEST_F(FileListTest, MissingMembersAreWarnedAboutAndLeftOut) {
                                        "gone.v\n" +
                                            dir.join("lists/a.v") + "\n");
     tesutest::MessageCapture capture;
-    EXPECT_EQ((std::vector<std::string>{"a.v", "sub/dir/../dir/file.v", "b.v"}), Strings(list));
+    EXPECT_EQ(Natives({"a.v", "sub/dir/../dir/file.v", "b.v"}), Strings(list));
     // The member text is kept as written; the warnings name the absolute, normalised path.
     // An absolute member is joined to the list's directory like any other.
     EXPECT_EQ(Missing("lists/gone.v") + Missing("outside.v") + Missing("lists/gone.v") +
-                  Missing("lists" + dir.join("lists/a.v")),
+                  Missing((dir.path()[0] == '/' ? "lists" : "lists/") + dir.join("lists/a.v")),
               capture.text());
 }
 
@@ -104,15 +112,15 @@ TEST_F(FileListTest, TraceLineNamesTheListAbsolutelyAtNormalLevel) {
     std::filesystem::current_path(dir.path());
     Tesu::DebugMessengerFactory::GetLogger()->SetLevel(Tesu::DebugMessenger::DEBUG_NORMAL);
     tesutest::MessageCapture capture;
-    EXPECT_EQ(std::vector<std::string>{"a.v"}, Strings("lists/../lists//files.lst"));
-    EXPECT_EQ("DEBUG[utilities] - Reading file list " + dir.join("lists/files.lst") + "\n" +
-                  Missing("lists/missing.v"),
+    EXPECT_EQ(Natives({"a.v"}), Strings("lists/../lists//files.lst"));
+    EXPECT_EQ("DEBUG[utilities] - Reading file list " +
+                  tesutest::Native(dir.join("lists/files.lst")) + "\n" + Missing("lists/missing.v"),
               capture.text());
 
     // Switched off for "utilities" alone, the trace goes while the warning stays.
     capture.clear();
     Tesu::DebugMessengerFactory::GetLogger("utilities")->SetLevel(Tesu::DebugMessenger::DEBUG_OFF);
-    EXPECT_EQ(std::vector<std::string>{"a.v"}, Strings("lists/files.lst"));
+    EXPECT_EQ(Natives({"a.v"}), Strings("lists/files.lst"));
     EXPECT_EQ(Missing("lists/missing.v"), capture.text());
 }
 
@@ -120,13 +128,15 @@ TEST_F(FileListTest, ListsThatCannotBeReadGiveNoMembers) {
     Tesu::DebugMessengerFactory::GetLogger()->SetLevel(Tesu::DebugMessenger::DEBUG_VERBOSE);
     tesutest::MessageCapture capture;
     EXPECT_TRUE(Strings(dir.join("lists/none.lst")).empty());
-    EXPECT_EQ("ERROR:tesutil - Cannot read " + dir.join("lists/none.lst") + "\n", capture.text());
+    EXPECT_EQ("ERROR:tesutil - Cannot read " + tesutest::Native(dir.join("lists/none.lst")) + "\n",
+              capture.text());
 
     // A directory can be read but does not open as a file.
     capture.clear();
     EXPECT_TRUE(Names(dir.join("lists/ip/")).empty());
     EXPECT_TRUE(Strings(dir.join("lists/sub/../ip")).empty());
-    const std::string cannotOpen = "ERROR:tesutil - Cannot open " + dir.join("lists/ip") + "\n";
+    const std::string cannotOpen =
+        "ERROR:tesutil - Cannot open " + tesutest::Native(dir.join("lists/ip")) + "\n";
     EXPECT_EQ(cannotOpen + cannotOpen, capture.text());
 
     // An empty list, or one of comments only, gives nothing and says nothing but the trace.
@@ -135,14 +145,14 @@ TEST_F(FileListTest, ListsThatCannotBeReadGiveNoMembers) {
     capture.clear();
     EXPECT_TRUE(Strings(empty).empty());
     EXPECT_TRUE(Strings(comments).empty());
-    EXPECT_EQ("DEBUG[utilities] - Reading file list " + empty + "\n" +
-                  "DEBUG[utilities] - Reading file list " + comments + "\n",
+    EXPECT_EQ("DEBUG[utilities] - Reading file list " + tesutest::Native(empty) + "\n" +
+                  "DEBUG[utilities] - Reading file list " + tesutest::Native(comments) + "\n",
               capture.text());
 }
 
 TEST_F(FileListTest, UnreadableListIsReportedAsSuch) {
-    if (getuid() == 0) {
-        GTEST_SKIP() << "permissions do not stop the superuser";
+    if (const char* reason = tesutest::WhyPermissionsDoNotLockOut()) {
+        GTEST_SKIP() << reason;
     }
     const std::string list = dir.write("lists/locked.lst", "a.v\n");
     std::filesystem::permissions(list, std::filesystem::perms::none);
@@ -157,14 +167,14 @@ TEST_F(FileListTest, NamesJoinTheListsDirectoryPartAsGiven) {
     std::filesystem::current_path(dir.path());
     tesutest::MessageCapture capture;
     // A relative list gives relative names: its directory part, then the member text.
-    EXPECT_EQ((std::vector<std::string>{"lists/a.v", "lists/sub/dir/file.v", "lists/b.v"}),
+    EXPECT_EQ(Natives({"lists/a.v", "lists/sub/dir/file.v", "lists/b.v"}),
               Names("lists/files.lst"));
-    EXPECT_EQ((std::vector<std::string>{"lists/../lists/a.v", "lists/../lists/sub/dir/file.v",
-                                        "lists/../lists/b.v"}),
-              Names("lists/../lists/files.lst"));
-    EXPECT_EQ((std::vector<std::string>{dir.join("lists/a.v"), dir.join("lists/sub/dir/file.v"),
-                                        dir.join("lists/b.v")}),
-              Names(dir.join("lists/files.lst")));
+    EXPECT_EQ(
+        Natives({"lists/../lists/a.v", "lists/../lists/sub/dir/file.v", "lists/../lists/b.v"}),
+        Names("lists/../lists/files.lst"));
+    EXPECT_EQ(
+        Natives({dir.join("lists/a.v"), dir.join("lists/sub/dir/file.v"), dir.join("lists/b.v")}),
+        Names(dir.join("lists/files.lst")));
     // The messages of the strings' reading, once per call.
     EXPECT_EQ(Missing("lists/missing.v") + Missing("lists/missing.v") + Missing("lists/missing.v"),
               capture.text());
@@ -172,7 +182,7 @@ TEST_F(FileListTest, NamesJoinTheListsDirectoryPartAsGiven) {
     // A list without a directory part lies in the working directory.
     std::filesystem::current_path(dir.join("lists"));
     dir.write("lists/here.lst", "a.v\nsub/dir/file.v\n");
-    EXPECT_EQ((std::vector<std::string>{"a.v", "sub/dir/file.v"}), Names("here.lst"));
+    EXPECT_EQ(Natives({"a.v", "sub/dir/file.v"}), Names("here.lst"));
 }
 
 TEST(FileListMemberSeparators, BecomeThePlatformsAndRunsCollapse) {

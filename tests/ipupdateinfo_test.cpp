@@ -1,7 +1,6 @@
 // The cores update level: the update log found among the installation roots and its first
 // "cores_level=" line.
 #include <gtest/gtest.h>
-#include <unistd.h>
 
 #include <filesystem>
 #include <string>
@@ -9,6 +8,7 @@
 
 #include "Port_PathList.h"
 #include "Port_String.h"
+#include "TestPlatform.h"
 #include "TestSupport.h"
 #include "Tesu_IPUpdateInfo.h"
 
@@ -118,13 +118,14 @@ TEST(GetCoresLevel, LogThatDoesNotOpenIsReportedWithItsPathAsBuilt) {
     EXPECT_EQ(2u, outcome.result);
     EXPECT_EQ(kUntouched, outcome.report);
     // Root, one separator (even after the root's own) and the name; not made absolute.
-    EXPECT_EQ("ERROR:tesutil - Couldn't open " + root + "/IPupdate.log for reading.\n",
+    EXPECT_EQ("ERROR:tesutil - Couldn't open " + root + tesutest::Native("/") +
+                  "IPupdate.log for reading.\n",
               outcome.messages);
 }
 
 TEST(GetCoresLevel, UnreadableLogIsPassedOver) {
-    if (getuid() == 0) {
-        GTEST_SKIP() << "permissions do not stop the superuser";
+    if (const char* reason = tesutest::WhyPermissionsDoNotLockOut()) {
+        GTEST_SKIP() << reason;
     }
     tesutest::TempDir top;
     const std::string locked = top.write("locked/IPupdate.log", "cores_level=1\n");
