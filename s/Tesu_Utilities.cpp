@@ -17,10 +17,6 @@
 #include "Tesu_DebugMessenger.h"
 #include "Tesu_FileListMember.h"
 
-#if defined(_WIN32)
-#include <windows.h>
-#endif
-
 TESU_MODULE_PORTABILITY_INIT("Tesu_Utilities")
 
 namespace Tesu {
@@ -587,11 +583,13 @@ std::vector<Port::FileName> Utilities::GetFileListFileNames(const Port::FileName
 }  // namespace Tesu
 
 #if defined(_WIN32)
-// The library's entry: thread attach and detach notifications are not wanted.
-BOOL WINAPI DllMain(HINSTANCE instance, DWORD reason, LPVOID /*reserved*/) {
-    if (reason == DLL_PROCESS_ATTACH) {
-        DisableThreadLibraryCalls(instance);
+// The library's entry: thread attach and detach notifications are not wanted. The layer makes
+// the system call, so that no operating-system header is needed here.
+extern "C" int __stdcall DllMain(void* instance, unsigned long reason, void* /*reserved*/) {
+    constexpr unsigned long kProcessAttach = 1;  // DLL_PROCESS_ATTACH
+    if (reason == kProcessAttach) {
+        Port::DisableThreadNotifications(instance);
     }
-    return TRUE;
+    return 1;
 }
 #endif
