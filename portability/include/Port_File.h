@@ -71,9 +71,10 @@ class PORT_API File {
 
     // Opens `name` and returns a stream that the caller releases with close, or null when the
     // file cannot be opened (missing, a directory, no permission, or an unknown access value).
-    // `binary` true keeps the bytes as stored; false asks for the platform's text mode, which
-    // on Windows translates line ends and on POSIX changes nothing. Lines read either way are
-    // the same, since readline drops the "\r" of "\r\n".
+    // `binary` true keeps the bytes as stored; false asks for the platform's text mode when
+    // writing, which on Windows writes "\n" as "\r\n" and on POSIX changes nothing. Reading
+    // always gives the bytes as stored (a Ctrl-Z byte does not end a file), so lines read either
+    // way are the same, since readline drops the "\r" of "\r\n".
     static Stream* open(const StringBase<char>& name, int access, bool binary);
     // Writes out and closes the stream, and frees it in every case. Returns false when
     // writing out or closing failed, or when `stream` is null.

@@ -2,7 +2,8 @@
 //
 // Texts are UTF-8 and become UTF-16 only here, at the system boundary; a name that is not
 // valid UTF-8 is refused rather than turned into a different name. Open files are C runtime
-// descriptors, so that the runtime's text mode (line ends translated) serves `binary` false.
+// descriptors, so that the runtime's text mode (line ends translated) serves `binary` false
+// when writing; reading is always binary.
 #include <direct.h>
 #include <fcntl.h>
 #include <io.h>
@@ -24,7 +25,13 @@ namespace os {
 
 namespace {
 
-// UTF-8 to UTF-16; false for bytes that are not UTF-8.
+// The most UTF-16 units the system takes in a name or an environment text; a longer one
+// names nothing, and is refused before path code whose time grows with the square of its
+// length (".." after "..") gets to it.
+constexpr int kLongestText = 32767;
+
+// UTF-8 to UTF-16; false for bytes that are not UTF-8, and for a text longer than the system
+// takes.
 bool widen(const std::string& text, std::wstring& wide) {
     wide.clear();
     if (text.empty()) {
@@ -36,7 +43,7 @@ bool widen(const std::string& text, std::wstring& wide) {
     const int length = static_cast<int>(text.size());
     const int count =
         ::MultiByteToWideChar(CP_UTF8, MB_ERR_INVALID_CHARS, text.data(), length, nullptr, 0);
-    if (count <= 0) {
+    if (count <= 0 || count > kLongestText) {
         return false;
     }
     wide.resize(static_cast<std::size_t>(count));
@@ -112,7 +119,11 @@ Handle openFile(const std::string& name, OpenMode mode, bool binary) {
     if (!widen(name, wide) || wide.empty()) {
         return INVALID_HANDLE;
     }
-    int flags = _O_NOINHERIT | (binary ? _O_BINARY : _O_TEXT);
+    // Reading is always binary: the runtime's text mode ends a file at its first Ctrl-Z byte
+    // (0x1A), which would silently drop every line after it. readline drops the "\r" of "\r\n"
+    // itself, so lines read are the same as in text mode. Writing keeps the mode asked for.
+    const bool binaryBytes = binary || mode == OpenMode::READ;
+    int flags = _O_NOINHERIT | (binaryBytes ? _O_BINARY : _O_TEXT);
     switch (mode) {
         case OpenMode::READ:
             flags |= _O_RDONLY;
