@@ -18,6 +18,7 @@
 #include "Port_Msg.h"
 #include "Port_PathList.h"
 #include "Port_String.h"
+#include "TestPlatform.h"
 #include "TestSupport.h"
 #include "Tesu_DebugMessenger.h"
 #include "Tesu_IPUpdateInfo.h"
@@ -289,7 +290,8 @@ TEST(Threads, DataFileReadersAgreeOnEveryThread) {
     // One warning per reading of the list, each whole.
     std::string expected;
     for (int i = 0; i < kThreads * kRounds; ++i) {
-        expected += "WARNING:tesutil - Missing file list member " + dir.join("missing.v") + "\n";
+        expected += "WARNING:tesutil - Missing file list member " +
+                    tesutest::Native(dir.join("missing.v")) + "\n";
     }
     EXPECT_EQ(capture.text(), expected);
 }
