@@ -20,3 +20,7 @@ ctest --test-dir "$build" --output-on-failure -j "$jobs"
 echo "== Unit tests as an unprivileged user (the file-permission cases)"
 bash scripts/test-unprivileged.sh "$(cd "$build" && pwd)"
 bash scripts/ci-windows.sh
+bash scripts/ci-sanitizers.sh
+bash scripts/ci-valgrind.sh "$build"
+bash scripts/ci-fuzz.sh
+bash scripts/ci-tsan.sh
