@@ -117,9 +117,10 @@ configure_and_build() {
   local arch=$1 tests=$2
   shift 2
   local build="$root/windows-$arch"
-  export WINEDEBUG=-all
-  export WINEPREFIX="$PWD/$build/wineprefix"
   mkdir -p "$build"
+  export WINEDEBUG=-all
+  export WINEPREFIX
+  WINEPREFIX="$(cd "$build" && pwd)/wineprefix"
   if [ "$tests" = ON ] && [ ! -f "$WINEPREFIX/system.reg" ]; then
     # Test discovery runs the test programs at build time: Wine must be ready first.
     local boot_start
@@ -142,7 +143,8 @@ run_tests() {
   local arch=$1
   local build="$root/windows-$arch"
   export WINEDEBUG=-all
-  export WINEPREFIX="$PWD/$build/wineprefix"
+  export WINEPREFIX
+  WINEPREFIX="$(cd "$build" && pwd)/wineprefix"
   local log="$build/ctest-wine.log"
   local status=0
   ctest --test-dir "$build" --output-on-failure -j "$jobs" 2>&1 | tee "$log" || status=$?

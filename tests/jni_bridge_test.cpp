@@ -1,6 +1,9 @@
 #include "Tesu_Tessel2MessageCatcher.h"
 
 #include <gtest/gtest.h>
+#if defined(_WIN32)
+#include <windows.h>
+#endif
 
 #include <stdexcept>
 #include <string>
@@ -14,11 +17,28 @@ namespace {
 
 using Method = void(JNICALL*)(JNIEnv*, jobject, jstring);
 
+#if defined(_WIN32) && defined(__i386__)
+// The 32-bit DLL exports the methods under the names a 32-bit JVM looks up ("_name@12", and the
+// plain name), which no import library links to: they are found the way the JVM finds them.
+Method Exported(const char* name) {
+    const HMODULE library = ::GetModuleHandleA("libTesu_Utilities.dll");
+    return reinterpret_cast<Method>(reinterpret_cast<void*>(::GetProcAddress(library, name)));
+}
+const Method kInfo =
+    Exported("_Java_com_quarnel_tesutil_tessel2_Tessel2MessageCatcher_outputInfoMessageN@12");
+const Method kWarning =
+    Exported("_Java_com_quarnel_tesutil_tessel2_Tessel2MessageCatcher_outputWarningMessageN@12");
+const Method kError =
+    Exported("_Java_com_quarnel_tesutil_tessel2_Tessel2MessageCatcher_outputErrorMessageN@12");
+const Method kDebug =
+    Exported("_Java_com_quarnel_tesutil_tessel2_Tessel2MessageCatcher_outputDebugMessageN@12");
+#else
 const Method kInfo = Java_com_quarnel_tesutil_tessel2_Tessel2MessageCatcher_outputInfoMessageN;
 const Method kWarning =
     Java_com_quarnel_tesutil_tessel2_Tessel2MessageCatcher_outputWarningMessageN;
 const Method kError = Java_com_quarnel_tesutil_tessel2_Tessel2MessageCatcher_outputErrorMessageN;
 const Method kDebug = Java_com_quarnel_tesutil_tessel2_Tessel2MessageCatcher_outputDebugMessageN;
+#endif
 
 // A JNIEnv whose function table has only the two string calls, which lend `bytes` and log
 // what they are given into `events`. Every other entry is null, so any other call crashes.

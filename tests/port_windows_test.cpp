@@ -169,7 +169,7 @@ TEST(WindowsFile, KindsOfNamesAsTheFileSystemGivesThem) {
     EXPECT_EQ(File::open(dir.c_str(), File::READ, true), nullptr);
 }
 
-TEST(WindowsFile, TextModeWritesCrLfAndBinaryModeKeepsTheBytes) {
+TEST(WindowsFile, TextModeWritesCrLfAndReadingKeepsEveryByte) {
     tesutest::TempDir tmp;
     const std::string text = tmp.join("text.txt");
     ASSERT_TRUE(writeText(text, File::WRITE, false, "a\nb\n"));
@@ -177,6 +177,9 @@ TEST(WindowsFile, TextModeWritesCrLfAndBinaryModeKeepsTheBytes) {
     EXPECT_EQ(bytesOf(text), "a\r\nb\r\nc\r\n");
     EXPECT_EQ(readLines(text, false), (Lines{"a", "b", "c"}));
     EXPECT_EQ(readLines(text, true), (Lines{"a", "b", "c"}));
+    // Reading in text mode does not stop at a Ctrl-Z byte, as the runtime's text mode would.
+    const std::string ctrlZ = tmp.write("ctrl-z.txt", "a\x1a b\r\nc\n");
+    EXPECT_EQ(readLines(ctrlZ, false), (Lines{"a\x1a b", "c"}));
 
     const std::string binary = tmp.join("binary.dat");
     ASSERT_TRUE(writeText(binary, File::WRITE, true, std::string("x\ny\r\n\0z", 7)));
