@@ -76,10 +76,11 @@ using Tesu::DebugMessenger;
 using LoggerByName = DebugMessenger* (*)(const Port::StringBase<char>&);
 using RootLogger = DebugMessenger* (*)();
 using ActiveLoggers = std::vector<Port::StringBase<char>>* (*)();
-// Constructor and destructor, called as the functions they are in the C++ ABI (on 32-bit
-// Windows member functions take `this` the thiscall way).
+// Constructor and destructor, called as the functions they are in the C++ ABI. On 32-bit
+// Windows member functions take `this` in ECX (thiscall), which a plain function pointer
+// cannot say; for a function whose only argument is `this`, fastcall passes it the same way.
 #if defined(_WIN32) && defined(__i386__)
-using Structor = void(__attribute__((thiscall)) *)(DebugMessenger*);
+using Structor = void(__attribute__((fastcall)) *)(DebugMessenger*);
 #else
 using Structor = void (*)(DebugMessenger*);
 #endif
