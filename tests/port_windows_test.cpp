@@ -15,6 +15,7 @@
 #include <filesystem>
 #include <fstream>
 #include <iterator>
+#include <stdexcept>
 #include <string>
 #include <vector>
 
@@ -116,6 +117,24 @@ TEST(WindowsFileName, RootedAndDriveRelativeNamesAreCompletedFromTheWorkingDirec
 
     // The head is absolute, native and ends in a separator.
     EXPECT_EQ(FileName("a/b.v").GetHead(true, true).str(), cwd + "\\a\\");
+}
+
+TEST(WindowsFileName, NameOnADriveThatIsNotThereCannotBeCompleted) {
+    // A drive letter the system does not know: its working directory cannot be read. The
+    // layer's exception crosses from its DLL into this program.
+    const DWORD drives = ::GetLogicalDrives();
+    char missing = 0;
+    for (char letter = 'Q'; letter >= 'D' && missing == 0; --letter) {
+        if ((drives & (1u << (letter - 'A'))) == 0) {
+            missing = letter;
+        }
+    }
+    ASSERT_NE(missing, 0) << "every drive letter from D to Q is in use";
+    const std::string relative = std::string(1, missing) + ":x";
+    EXPECT_THROW(FileName(relative.c_str()).GetAbsolutePath(false), std::runtime_error);
+    // With its root the name needs no working directory.
+    EXPECT_EQ(absolute((std::string(1, missing) + ":\\x\\..\\y").c_str()),
+              std::string(1, missing) + ":\\y");
 }
 
 TEST(WindowsFileName, PartsAreJoinedWithTheBackslash) {
