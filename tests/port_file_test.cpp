@@ -221,6 +221,18 @@ TEST(PortFile, OpenRefusesWhatCannotBeRead) {
                    File::READ, true),
         nullptr);
     EXPECT_FALSE(File::close(nullptr));
+#ifndef _WIN32
+    // Neither a FIFO without a writer (which would block the open for good) nor an endless
+    // device is read as a file; writing to a device still works.
+    const std::string fifo = tmp.join("fifo");
+    ASSERT_EQ(::mkfifo(fifo.c_str(), 0600), 0);
+    EXPECT_EQ(File::open(fifo.c_str(), File::READ, true), nullptr);
+    EXPECT_EQ(File::open("/dev/zero", File::READ, true), nullptr);
+    Stream* devNull = File::open("/dev/null", File::WRITE, true);
+    ASSERT_NE(devNull, nullptr);
+    EXPECT_TRUE(devNull->write("x\n", 2));
+    EXPECT_TRUE(File::close(devNull));
+#endif
 }
 
 TEST(PortFile, WriteAppendAndReadBack) {

@@ -70,7 +70,9 @@ class PORT_API File {
     };
 
     // Opens `name` and returns a stream that the caller releases with close, or null when the
-    // file cannot be opened (missing, a directory, no permission, or an unknown access value).
+    // file cannot be opened (missing, a directory, no permission, or an unknown access value);
+    // for reading, anything but a regular file (a FIFO, a device) is refused too, since it may
+    // never end or wait for a writer for good.
     // `binary` true keeps the bytes as stored; false asks for the platform's text mode when
     // writing, which on Windows writes "\n" as "\r\n" and on POSIX changes nothing. Reading
     // always gives the bytes as stored (a Ctrl-Z byte does not end a file), so lines read either

@@ -230,8 +230,11 @@ Stream* File::open(const StringBase<char>& name, int access, bool binary) {
     if (handle == os::INVALID_HANDLE) {
         return nullptr;
     }
-    // Some systems open a directory for reading; it has no bytes to give as lines.
-    if (os::handleKind(handle) == os::Kind::DIRECTORY) {
+    // Some systems open a directory for reading; it has no bytes to give as lines. Nor is
+    // anything else but a regular file read: a FIFO or a device may never end (/dev/zero is
+    // one endless line) or wait for a writer for good.
+    const os::Kind kind = os::handleKind(handle);
+    if (kind == os::Kind::DIRECTORY || (mode == os::OpenMode::READ && kind != os::Kind::FILE)) {
         os::closeFile(handle);
         return nullptr;
     }

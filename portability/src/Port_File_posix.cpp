@@ -42,7 +42,9 @@ Handle openFile(const std::string& name, OpenMode mode, bool /*binary*/) {
     int flags = O_CLOEXEC;
     switch (mode) {
         case OpenMode::READ:
-            flags |= O_RDONLY;
+            // Non-blocking only for the open itself: a FIFO without a writer would otherwise
+            // block here for good. File::open then refuses whatever is not a regular file.
+            flags |= O_RDONLY | O_NONBLOCK;
             break;
         case OpenMode::WRITE:
             flags |= O_WRONLY | O_CREAT | O_TRUNC;
@@ -55,7 +57,16 @@ Handle openFile(const std::string& name, OpenMode mode, bool /*binary*/) {
     do {
         result = ::open(name.c_str(), flags, 0666);
     } while (result < 0 && errno == EINTR);
-    return result < 0 ? INVALID_HANDLE : static_cast<Handle>(result);
+    if (result < 0) {
+        return INVALID_HANDLE;
+    }
+    if ((flags & O_NONBLOCK) != 0) {
+        const int status = ::fcntl(result, F_GETFL);
+        if (status != -1) {
+            ::fcntl(result, F_SETFL, status & ~O_NONBLOCK);
+        }
+    }
+    return static_cast<Handle>(result);
 }
 
 std::int64_t readFile(Handle handle, void* buffer, std::size_t size) {
