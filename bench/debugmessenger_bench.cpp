@@ -133,7 +133,7 @@ void BM_EnabledNormal(benchmark::State& state) {
     DebugMessengerFactory::GetLogger()->SetLevel(DebugMessenger::DEBUG_OFF);
     DebugMessenger* logger = DebugMessengerFactory::GetLogger("bench.enabled");
     logger->SetLevel(DebugMessenger::DEBUG_NORMAL);
-    const Port::StringBase<char> text("step 17 of 40 done, 3 files read");
+    const Port::StringBase<char> text("stage 17 of 40 done, 3 files read");
 
     const std::int64_t before = Allocations();
     for (auto _ : state) {

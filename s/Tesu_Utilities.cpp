@@ -73,17 +73,29 @@ Port::StringBase<char> Utilities::TerminateWithPathSeparator(const Port::StringB
     return result;
 }
 
+namespace {
+
+// Where both absolute operations start, for a non-empty `path`: its native text, with a
+// separator added when it names an existing directory, made absolute. `directory` tells
+// whether it named one.
+Port::StringBase<char> absoluteForm(const Port::StringBase<char>& path, bool& directory) {
+    Port::StringBase<char> native = nativeText(path);
+    directory = Port::File::isdir(native);
+    if (directory) {
+        native = Utilities::TerminateWithPathSeparator(native);
+    }
+    return absoluteText(native);
+}
+
+}  // namespace
+
 Port::StringBase<char> Utilities::GetAbsolutePath(const Port::StringBase<char>& path) {
     if (path.IsEmpty()) {
         return Port::StringBase<char>();
     }
-    Port::StringBase<char> native = nativeText(path);
-    const bool directory = Port::File::isdir(native);
-    if (directory) {
-        native = TerminateWithPathSeparator(native);
-    }
+    bool directory = false;
     // The absolute form drops a trailing separator; a directory gets it back.
-    const Port::StringBase<char> absolute = absoluteText(absoluteText(native));
+    const Port::StringBase<char> absolute = absoluteText(absoluteForm(path, directory));
     return directory ? TerminateWithPathSeparator(absolute) : absolute;
 }
 
@@ -91,12 +103,8 @@ Port::StringBase<char> Utilities::GetAbsoluteDirectory(const Port::StringBase<ch
     if (path.IsEmpty()) {
         return Port::StringBase<char>();
     }
-    Port::StringBase<char> native = nativeText(path);
-    const bool directory = Port::File::isdir(native);
-    if (directory) {
-        native = TerminateWithPathSeparator(native);
-    }
-    const Port::StringBase<char> absolute = absoluteText(native);
+    bool directory = false;
+    const Port::StringBase<char> absolute = absoluteForm(path, directory);
     if (directory) {
         return TerminateWithPathSeparator(absoluteText(absolute));
     }
