@@ -267,21 +267,28 @@ bool realPath(const std::string& name, std::string& resolved) {
     return true;
 }
 
-bool currentDirectory(std::string& directory, std::string& reason) {
-    wchar_t* buffer = ::_wgetcwd(nullptr, 0);
+// Takes a directory that the C runtime allocated (null when it failed, with errno set),
+// frees it and gives it as UTF-8. The system keeps the drive root's separator and no other
+// trailing one.
+bool takeDirectory(wchar_t* buffer, const char* unknown, std::string& directory,
+                   std::string& reason) {
     if (buffer == nullptr) {
         reason = std::strerror(errno);
         return false;
     }
-    // The system keeps the drive root's separator and no other trailing one.
     std::string result = narrow(buffer, std::wcslen(buffer));
     std::free(buffer);
     if (result.empty()) {
-        reason = "the working directory is not known";
+        reason = unknown;
         return false;
     }
     directory.swap(result);
     return true;
+}
+
+bool currentDirectory(std::string& directory, std::string& reason) {
+    return takeDirectory(::_wgetcwd(nullptr, 0), "the working directory is not known", directory,
+                         reason);
 }
 
 bool changeDirectory(const std::string& directory) {
@@ -295,19 +302,8 @@ bool driveDirectory(char drive, std::string& directory, std::string& reason) {
         reason = "no such drive";
         return false;
     }
-    wchar_t* buffer = ::_wgetdcwd(letter - 'A' + 1, nullptr, 0);
-    if (buffer == nullptr) {
-        reason = std::strerror(errno);
-        return false;
-    }
-    std::string result = narrow(buffer, std::wcslen(buffer));
-    std::free(buffer);
-    if (result.empty()) {
-        reason = "the drive's working directory is not known";
-        return false;
-    }
-    directory.swap(result);
-    return true;
+    return takeDirectory(::_wgetdcwd(letter - 'A' + 1, nullptr, 0),
+                         "the drive's working directory is not known", directory, reason);
 }
 
 bool readDirectory(const std::string& directory, std::vector<DirEntry>& entries) {
