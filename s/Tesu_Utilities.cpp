@@ -29,14 +29,13 @@ constexpr const char* kSourcePath = "../s/Tesu_Utilities";
 constexpr const char* kRevision = "$Revision: 1.37.14.1 $";
 
 // A message source for a message issued at `line` of this module.
-[[maybe_unused]] Port_MsgManData messageSource(int line) {
+Port_MsgManData messageSource(int line) {
     return Port_MsgManData::createObject(kApplication, kSourcePath, line, kRevision);
 }
 
 }  // namespace
 
 // ==== Path texts =============================================================================
-// PATHS-BEGIN
 namespace {
 
 // The native text of `path`: its separators turned into the platform's.
@@ -130,10 +129,8 @@ Port::StringBase<char> Utilities::MakeRelativePath(const Port::StringBase<char>&
     relative.Append(absolute.Extract(Port_Range{baseLength, Port::NPOS}));
     return relative;
 }
-// PATHS-END
 
 // ==== Installation search ====================================================================
-// SEARCH-BEGIN
 namespace {
 
 // The IP container under an installation root; one text, with slashes on every platform.
@@ -219,10 +216,8 @@ bool Utilities::GetJavaExecutablePath(Port::StringBase<char>& javaPath) {
     }
     return GetFullQuarnelPathOf(relativeName, javaPath);
 }
-// SEARCH-END
 
 // ==== Identity and versions ==================================================================
-// IDENTITY-BEGIN
 namespace {
 
 // The compiler's stamps of this module's build: "Mmm dd yyyy" and "hh:mm:ss".
@@ -281,10 +276,8 @@ Port::StringBase<char> Utilities::NextMajorRelease() {
     }
     return result;
 }
-// IDENTITY-END
 
 // ==== Checksummed files ======================================================================
-// CHECKSUM-BEGIN
 namespace {
 
 // Closes a stream on the way out when an exception leaves the reading code, so that a
@@ -518,10 +511,8 @@ unsigned int Utilities::ValidateFileChecksum(const Port::StringBase<char>& fileN
     }
     return 0;
 }
-// CHECKSUM-END
 
 // ==== File lists =============================================================================
-// FILELIST-BEGIN
 std::vector<Port::StringBase<char>> Utilities::GetFileListFileStrings(const Port::FileName& list) {
     std::vector<Port::StringBase<char>> members;
     const Port::StringBase<char> directory = list.GetHead(true, false);
@@ -586,7 +577,6 @@ std::vector<Port::FileName> Utilities::GetFileListFileNames(const Port::FileName
     }
     return names;
 }
-// FILELIST-END
 
 }  // namespace Tesu
 
