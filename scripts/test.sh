@@ -12,6 +12,9 @@ bash scripts/install-deps.sh
 jobs=$(nproc 2>/dev/null || echo 2)
 build=${TESU_BUILD_DIR:-build/ci}
 
+echo "== Formatting"
+bash scripts/check-format.sh
+
 echo "== Build ($build): RelWithDebInfo, warnings as errors"
 cmake -S . -B "$build" -G Ninja -DCMAKE_BUILD_TYPE=RelWithDebInfo -DTESU_WERROR=ON
 cmake --build "$build" -j "$jobs"
