@@ -32,7 +32,19 @@ constexpr bool kSharedAllocator = false;
 void (*const __lsan_disable)() = nullptr;
 void (*const __lsan_enable)() = nullptr;
 #else
+// Under ThreadSanitizer the runtime owns operator new and delete: they cannot be replaced.
+#if defined(__SANITIZE_THREAD__)
+#define TESU_RUNTIME_OWNS_NEW 1
+#elif defined(__has_feature)
+#if __has_feature(thread_sanitizer)
+#define TESU_RUNTIME_OWNS_NEW 1
+#endif
+#endif
+#if defined(TESU_RUNTIME_OWNS_NEW)
+constexpr bool kSharedAllocator = false;
+#else
 constexpr bool kSharedAllocator = true;
+#endif
 extern "C" void __lsan_disable() __attribute__((weak));
 extern "C" void __lsan_enable() __attribute__((weak));
 #endif
@@ -45,7 +57,7 @@ std::atomic<long> allocations{0};
 std::atomic<const void*> watched{nullptr};
 std::atomic<bool> watchedFreed{false};
 
-void NoteFree(const void* pointer) {
+[[maybe_unused]] void NoteFree(const void* pointer) {
     if (pointer != nullptr && pointer == watched.load()) {
         watchedFreed = true;
     }
@@ -53,6 +65,7 @@ void NoteFree(const void* pointer) {
 
 }  // namespace
 
+#if !defined(TESU_RUNTIME_OWNS_NEW)
 void* operator new(std::size_t size) {
     allocations.fetch_add(1);
     if (void* pointer = std::malloc(size == 0 ? 1 : size)) {
@@ -69,6 +82,7 @@ void* operator new(std::size_t size) {
     NoteFree(pointer);
     std::free(pointer);
 }
+#endif
 
 namespace {
 
