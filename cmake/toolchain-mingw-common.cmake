@@ -14,12 +14,8 @@ set(CMAKE_FIND_ROOT_PATH_MODE_PACKAGE ONLY)
 # Static zlib, so that nothing but the system's DLLs and the project's own is needed.
 set(ZLIB_USE_STATIC_LIBS ON)
 
-# The C and C++ runtimes (libgcc, libstdc++, winpthread) are linked into every DLL and
-# program, so they run without MinGW's DLLs beside them. Each module then has its own copy
-# of the C++ runtime: its own std::cerr and its own operator new.
-set(CMAKE_EXE_LINKER_FLAGS_INIT "-static")
-set(CMAKE_SHARED_LINKER_FLAGS_INIT "-static")
-set(CMAKE_MODULE_LINKER_FLAGS_INIT "-static")
+# The C and C++ runtimes (libgcc, libstdc++, winpthread) are MinGW's DLLs, shared by every
+# module: the project's CMakeLists copies them beside the programs (cmake/TesuMingwRuntime.cmake).
 
 # Programs and DLLs side by side in <build>/bin: the Windows loader finds DLLs beside the
 # program, and the installation prefix (the folder above libPortability's) is <build>, as on

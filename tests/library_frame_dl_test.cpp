@@ -26,8 +26,8 @@
 // The root logger and the registry are leaked on purpose. LeakSanitizer, where present, is
 // told to ignore what is allocated while the library is loaded.
 #if defined(_WIN32)
-// Each Windows module links its own C++ runtime: the library's allocations do not come
-// through this program's operator new, and there is no LeakSanitizer.
+// On Windows a program's own operator new serves that program only (the library takes its
+// from the C++ runtime's DLL), and there is no LeakSanitizer.
 constexpr bool kSharedAllocator = false;
 void (*const __lsan_disable)() = nullptr;
 void (*const __lsan_enable)() = nullptr;

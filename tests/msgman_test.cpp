@@ -21,11 +21,6 @@ static_assert(!std::is_copy_constructible<Tesu::MsgMan>::value &&
 
 namespace {
 
-#if defined(_WIN32)
-// The library's std::cerr is its own on Windows (each module links its C++ runtime): what it
-// writes is caught on the process's standard error instead.
-using CerrCapture = tesutest::StandardErrorCapture;
-#else
 // Sends std::cerr into a string for the guard's lifetime.
 class CerrCapture {
   public:
@@ -37,7 +32,6 @@ class CerrCapture {
     std::ostringstream buffer_;
     std::streambuf* saved_;
 };
-#endif
 
 const int kTypes[] = {0, 1, 2, 4, 7, 8, 3};
 
@@ -141,10 +135,6 @@ TEST(MsgMan, LevelsSetTheSwitchesOfStandardErrorOnly) {
 }
 
 TEST(MsgMan, RemovedStreamsGetNothingMore) {
-#if defined(_WIN32)
-    GTEST_SKIP() << "each Windows module has its own std::cerr: this program's cannot name the "
-                    "library's";
-#endif
     CerrCapture cerr;
     std::ostringstream added;
     Tesu::MsgMan manager;

@@ -9,13 +9,7 @@
 #include <string>
 
 #if defined(_WIN32)
-#include <fcntl.h>
-#include <io.h>
 #include <windows.h>
-
-#include <cstdio>
-#include <fstream>
-#include <iterator>
 #else
 #include <dlfcn.h>
 #include <unistd.h>
@@ -103,55 +97,6 @@ inline std::string Native(std::string path) {
 #endif
     return path;
 }
-
-#if defined(_WIN32)
-// Sends the process's standard error (descriptor 2) into a temporary file for the guard's
-// lifetime. On Windows every module has its own copy of the C++ runtime and so its own
-// std::cerr; they all write through the one C runtime to descriptor 2, where this catches
-// what any of them writes.
-class StandardErrorCapture {
-  public:
-    StandardErrorCapture() {
-        char directory[MAX_PATH + 1];
-        const DWORD length = ::GetTempPathA(sizeof directory, directory);
-        if (length == 0 || length > MAX_PATH ||
-            ::GetTempFileNameA(directory, "tsu", 0, name_) == 0) {
-            return;
-        }
-        file_ = ::_open(name_, _O_RDWR | _O_BINARY | _O_TRUNC);
-        std::fflush(stderr);
-        saved_ = ::_dup(2);
-        if (file_ >= 0 && saved_ >= 0) {
-            ::_dup2(file_, 2);
-        }
-    }
-    ~StandardErrorCapture() {
-        std::fflush(stderr);
-        if (saved_ >= 0) {
-            ::_dup2(saved_, 2);
-            ::_close(saved_);
-        }
-        if (file_ >= 0) {
-            ::_close(file_);
-        }
-        ::DeleteFileA(name_);
-    }
-    StandardErrorCapture(const StandardErrorCapture&) = delete;
-    StandardErrorCapture& operator=(const StandardErrorCapture&) = delete;
-
-    // Everything written so far.
-    std::string text() const {
-        std::fflush(stderr);
-        std::ifstream in(name_, std::ios::binary);
-        return std::string(std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>());
-    }
-
-  private:
-    char name_[MAX_PATH + 1] = {};
-    int file_ = -1;
-    int saved_ = -1;
-};
-#endif
 
 // A library loaded by hand: LoadLibrary/GetProcAddress/FreeLibrary on Windows,
 // dlopen/dlsym/dlclose elsewhere.
