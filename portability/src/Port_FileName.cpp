@@ -154,7 +154,7 @@ std::string completed(const std::string& text) {
         std::string reason;
         if (!os::driveDirectory(text[0], directory, reason)) {
             throw std::runtime_error("cannot read the working directory of drive " +
-                                     text.substr(0, 2) + ": " + reason);
+                                     text.substr(0, 1) + ": " + reason);
         }
         return directory + os::kPathSeparator + text.substr(2);
     }
