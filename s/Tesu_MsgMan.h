@@ -37,7 +37,8 @@ class TESU_API MsgMan {
     // Level DIAG_STANDARD.
     MsgMan();
     // The referenced level, read once; any value other than 0, 1 and 3 acts as DIAG_STANDARD.
-    explicit MsgMan(const DiagnosticLevel& level);
+    // Not explicit: `Tesu::MsgMan manager = Tesu::MsgMan::DIAG_FULL;` makes a manager too.
+    MsgMan(const DiagnosticLevel& level);  // NOLINT(google-explicit-constructor)
     ~MsgMan();
     MsgMan(const MsgMan&) = delete;
     MsgMan& operator=(const MsgMan&) = delete;

@@ -18,6 +18,8 @@
 static_assert(!std::is_copy_constructible<Tesu::MsgMan>::value &&
                   !std::is_copy_assignable<Tesu::MsgMan>::value,
               "a MsgMan owns a registered message stream and must not be copied");
+static_assert(std::is_convertible<Tesu::MsgMan::DiagnosticLevel, Tesu::MsgMan>::value,
+              "a level makes a manager: Tesu::MsgMan manager = Tesu::MsgMan::DIAG_FULL;");
 
 namespace {
 
