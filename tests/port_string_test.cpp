@@ -144,6 +144,12 @@ TEST(PortString, CompareExactAndIgnoringLetterCase) {
     EXPECT_NE(String("[").Compare("{", Port::COMPARE_NOCASE), 0);
     EXPECT_NE(String("\xc9").Compare("\xe9", Port::COMPARE_NOCASE), 0);
     EXPECT_LT(String("_").Compare("A", Port::COMPARE_NOCASE), 0);  // folds to lower case
+    // The types may be given as numbers: 1 ignores case, 0 and any other value compare exactly.
+    EXPECT_EQ(s.Compare("rOOT", 1), 0);
+    EXPECT_NE(s.Compare("rOOT", 0), 0);
+    EXPECT_NE(s.Compare("rOOT", 7), 0);
+    EXPECT_EQ(String("a/b").GetIndexOfString("/B", 1), 1u);
+    EXPECT_EQ(String("a/b").GetIndexOfString("/B", 0), NPOS);
 }
 
 TEST(PortString, SearchesHonourStartAndAlternative) {

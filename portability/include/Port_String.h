@@ -20,18 +20,18 @@ namespace Port {
 
 constexpr std::size_t NPOS = static_cast<std::size_t>(-1);
 
-// How two texts are compared or searched.
-enum CompareType : int {
-    COMPARE_EXACT = 0,   // byte for byte
-    COMPARE_NOCASE = 1,  // ASCII letters compared without regard to case; other bytes exactly
-};
+// How two texts are compared or searched. The types are plain integers, so that a caller may
+// pass the number (0, 1) as well as the name.
+using CompareType = int;
+constexpr CompareType COMPARE_EXACT = 0;   // byte for byte; also every value other than 1
+constexpr CompareType COMPARE_NOCASE = 1;  // ASCII letters compared without regard to case;
+                                           // other bytes exactly
 
-// Which ends of a text Trim works on.
-enum TrimType : int {
-    TRIM_START = 0,
-    TRIM_END = 1,
-    TRIM_BOTH = 2,
-};
+// Which ends of a text Trim works on; any other value trims nothing.
+using TrimType = int;
+constexpr TrimType TRIM_START = 0;
+constexpr TrimType TRIM_END = 1;
+constexpr TrimType TRIM_BOTH = 2;
 
 }  // namespace Port
 
