@@ -18,9 +18,11 @@ namespace {
 
 using Tesu::Utilities;
 
+// The list's name is passed as a bare text here and as a Port::String below: either converts
+// to the FileName the operations take.
 std::vector<std::string> Strings(const std::string& list) {
     std::vector<std::string> texts;
-    for (const auto& member : Utilities::GetFileListFileStrings(Port::FileName(list.c_str()))) {
+    for (const auto& member : Utilities::GetFileListFileStrings(list.c_str())) {
         texts.push_back(member.str());
     }
     return texts;
@@ -28,7 +30,7 @@ std::vector<std::string> Strings(const std::string& list) {
 
 std::vector<std::string> Names(const std::string& list) {
     std::vector<std::string> texts;
-    for (const auto& name : Utilities::GetFileListFileNames(Port::FileName(list.c_str()))) {
+    for (const auto& name : Utilities::GetFileListFileNames(Port::String(list))) {
         texts.push_back(name.GetText().str());
     }
     return texts;

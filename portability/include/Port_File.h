@@ -85,15 +85,19 @@ class PORT_API File {
     // True for an existing file or directory (symbolic links followed).
     static bool exist(const StringBase<char>& name);
     static bool exist(const FileName& name);
+    static bool exist(const char* name) { return exist(StringBase<char>(name)); }
     // True for an existing regular file.
     static bool isfile(const StringBase<char>& name);
     static bool isfile(const FileName& name);
+    static bool isfile(const char* name) { return isfile(StringBase<char>(name)); }
     // True for an existing directory.
     static bool isdir(const StringBase<char>& name);
     static bool isdir(const FileName& name);
+    static bool isdir(const char* name) { return isdir(StringBase<char>(name)); }
     // True when `name` exists and this process may read it.
     static bool canread(const StringBase<char>& name);
     static bool canread(const FileName& name);
+    static bool canread(const char* name) { return canread(StringBase<char>(name)); }
 
     // The current working directory, absolute, without a trailing separator (except for the
     // root). Throws std::runtime_error when it cannot be read (for example when it has been

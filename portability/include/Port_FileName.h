@@ -17,9 +17,10 @@ class PORT_API FileName {
   public:
     FileName() = default;
     // Splits `text` after its last separator: the head is everything up to and including that
-    // separator, the tail the rest. A text without a separator is all tail.
-    explicit FileName(const StringBase<char>& text);
-    explicit FileName(const char* text);
+    // separator, the tail the rest. A text without a separator is all tail. Not explicit: a
+    // text may be passed wherever a FileName is asked for.
+    FileName(const StringBase<char>& text);  // NOLINT(google-explicit-constructor)
+    FileName(const char* text);              // NOLINT(google-explicit-constructor)
 
     // The directory part, ending in a separator, or the empty text when there is none.
     // With `native` true its separators are the platform's; with `absolute` true it is the
