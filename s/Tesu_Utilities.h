@@ -108,7 +108,9 @@ class TESU_API Utilities {
     // an empty result; a list that does not close gives "Cannot close <...>" and the members
     // all the same. Traces "Reading file list <absolute path>" at normal level on
     // "utilities". Every member is joined to the list's directory part (GetHead(true, false)),
-    // also one that is itself absolute; a directory counts as an existing member.
+    // also one that is itself absolute; a directory counts as an existing member. A member
+    // holding a NUL byte names no file (the layer refuses such names rather than cut them at
+    // the NUL): it is left out with the warning, which shows its text up to the NUL.
 
     // The cleaned member texts of every existing member, in list order (repeats kept).
     static std::vector<Port::StringBase<char>> GetFileListFileStrings(const Port::FileName& list);
