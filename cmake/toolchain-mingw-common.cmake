@@ -11,7 +11,7 @@ set(CMAKE_FIND_ROOT_PATH_MODE_PROGRAM NEVER)
 set(CMAKE_FIND_ROOT_PATH_MODE_LIBRARY ONLY)
 set(CMAKE_FIND_ROOT_PATH_MODE_INCLUDE ONLY)
 set(CMAKE_FIND_ROOT_PATH_MODE_PACKAGE ONLY)
-# Static zlib, so that nothing but the system's DLLs and the project's own is needed.
+# Static zlib: one DLL fewer to ship beside the libraries.
 set(ZLIB_USE_STATIC_LIBS ON)
 
 # The C and C++ runtimes (libgcc, libstdc++, winpthread) are MinGW's DLLs, shared by every
