@@ -3,7 +3,8 @@
 set -euo pipefail
 
 packages=(cmake ninja-build g++ clang libgtest-dev libgmock-dev libbenchmark-dev
-          libdeflate-dev zlib1g-dev openjdk-17-jdk-headless)
+          libdeflate-dev zlib1g-dev openjdk-17-jdk-headless libcli11-dev help2man
+          bash-completion)
 missing=()
 for p in "${packages[@]}"; do
   dpkg-query -W -f='${Status}' "$p" 2>/dev/null | grep -q "install ok installed" || missing+=("$p")

@@ -1,8 +1,11 @@
 // tesutil debug-demo: debug lines at each level, and the debug timers.
 #include <chrono>
-#include <iostream>
+#include <memory>
+#include <string>
 #include <thread>
 #include <vector>
+
+#include <CLI/CLI.hpp>
 
 #include "Port_String.h"
 #include "Tesu_DebugMessenger.h"
@@ -12,16 +15,13 @@ namespace tesutil {
 
 namespace {
 
-int RunDebugDemo(const Arguments& arguments) {
-    const ParsedArguments parsed = ParseArguments(arguments, {}, {"--debug"});
-    ExpectOperands(parsed, 0, 0, "no operands");
-
+// `level` is the command's own --debug, empty when it was not given.
+int RunDebugDemo(const std::string& level) {
     // The command's own --debug wins; then the global one; a demonstration with every line
     // switched off would show nothing, so the default here is normal.
     Tesu::DebugMessenger* root = Tesu::DebugMessengerFactory::GetLogger();
-    const auto given = parsed.values.find("--debug");
-    if (given != parsed.values.end()) {
-        root->SetLevel(ParseDebugLevel(given->second));
+    if (!level.empty()) {
+        root->SetLevel(DebugLevelOf(level));
     } else if (!GlobalDebugLevelGiven()) {
         root->SetLevel(Tesu::DebugMessenger::DEBUG_NORMAL);
     }
@@ -51,28 +51,30 @@ int RunDebugDemo(const Arguments& arguments) {
         step.Normal(line);
     }
 
-    std::cout << "named loggers in the registry:";
-    std::vector<Port::StringBase<char>>* names = Tesu::DebugMessengerFactory::GetActiveLoggers();
+    std::string line = "named loggers in the registry:";
+    const std::unique_ptr<std::vector<Port::StringBase<char>>> names(
+        Tesu::DebugMessengerFactory::GetActiveLoggers());
     for (const auto& name : *names) {
-        std::cout << ' ' << name.str();
+        line += ' ' + name.str();
     }
-    delete names;
-    std::cout << '\n';
+    PrintLine(line);
     return kExitOk;
 }
 
 }  // namespace
 
-const std::vector<Command>& DebugCommands() {
-    static const std::vector<Command> commands = {
-        {"debug-demo", "write debug lines at each level and show the debug timers",
-         "[--debug off|normal|detailed|verbose]\n"
-         "  Sets the root logger to the level given (default: the global --debug, else normal),\n"
-         "  writes lines at each level through the root, a named logger and a logger of its\n"
-         "  own, shows a timer, and lists the named loggers.\n",
-         RunDebugDemo},
-    };
-    return commands;
+void AddDebugCommands(CLI::App& tool, Commands& commands) {
+    auto level = std::make_shared<std::string>();
+    Command& demo = AddCommand(
+        tool, commands, "Debugging", "debug-demo",
+        "write debug lines at each level and show the debug timers",
+        "Sets the root logger to the level given (default: the global --debug, else normal),\n"
+        "writes lines at each level through the root, a named logger and a logger of its\n"
+        "own, shows a timer, and lists the named loggers.");
+    demo.app->add_option("--debug", *level, "root logger level: off, normal, detailed, verbose")
+        ->type_name("LEVEL")
+        ->check(DebugLevelCheck());
+    demo.run = [level] { return RunDebugDemo(*level); };
 }
 
 }  // namespace tesutil

@@ -1,20 +1,15 @@
-// tesutil commands on data files: verify, stamp, checksum, filelist.
+// tesutil commands on data files: verify, stamp (commands_stamp.cpp), checksum, filelist, and
+// the names they work on (operands, --files-from, "-" for standard input).
 //
-// The library reads checksummed files but writes none; `stamp` is the writer. It computes the
-// checksum of the file's content as the library reads it, rewrites only the checksum line (or
-// puts a new one first), and replaces the file atomically: the new text goes to a temporary
-// file beside the original, is checked with the library, and is then renamed over it, so that
-// a crash leaves either the old file or the new one, never a half-written one.
+// verify and checksum read each file once through the library's silent scan, which holds one
+// block of the file at a time, and report every failure themselves, once, on the standard
+// error stream, with the system's reason.
 #include <cstdint>
-#include <filesystem>
-#include <fstream>
-#include <iostream>
-#include <iterator>
-#include <random>
-#include <sstream>
+#include <memory>
 #include <string>
-#include <system_error>
 #include <vector>
+
+#include <CLI/CLI.hpp>
 
 #include "Port_File.h"
 #include "Port_FileName.h"
@@ -26,279 +21,211 @@ namespace tesutil {
 
 namespace {
 
-namespace fs = std::filesystem;
+struct StreamCloser {
+    void operator()(Port::Stream* stream) const { Port::File::close(stream); }
+};
+using OpenStream = std::unique_ptr<Port::Stream, StreamCloser>;
 
-const char kMarker[] = "# CRC:";
-constexpr std::size_t kMarkerLength = sizeof kMarker - 1;
+struct VerifyOptions {
+    NameSource names;
+    bool quiet = false;
+    bool status = false;
+    bool strict = false;
+};
 
-// Why `name` cannot be used as a file: "no such file", "is a directory", or the empty text
-// when it is a readable file as far as can be told.
-std::string ProblemWithFile(const std::string& name) {
-    if (!Port::File::exist(name)) {
-        return "no such file";
-    }
-    if (Port::File::isdir(name)) {
-        return "is a directory";
-    }
-    if (!Port::File::canread(name)) {
-        return "cannot be read";
-    }
-    return std::string();
-}
-
-// The file's content as the library's checksum check reads it: each line as the layer's
-// line reader delivers it (CR-LF and LF ends alike), followed by "\n". False when the file
-// does not open or does not close.
-bool ReadAsChecked(const std::string& name, Port::StringBase<char>& content) {
-    Port::Stream* stream = Port::File::open(name, Port::File::READ, true);
-    if (stream == nullptr) {
+bool VerifyOne(const std::string& name, const VerifyOptions& options) {
+    Tesu::ChecksumScan scan;
+    if (ScanNamed(name, scan) != 0) {
+        if (!options.status) {
+            FailFile("verify", name, scan.reason.str());
+        }
         return false;
     }
-    content.Empty();
-    Port::StringBase<char> line;
-    while (!stream->geteof()) {
-        stream->readline(line);
-        content.Append(line);
-        content.Append("\n");
+    bool ok = scan.valid;
+    std::string verdict = ok ? ": OK" : ": FAILED";
+    if (ok && options.strict && !scan.marked) {
+        ok = false;
+        verdict = ": FAILED (no checksum line)";
     }
-    return Port::File::close(stream);
+    if (!options.status && !(ok && options.quiet)) {
+        PrintLine(NameLine(name, verdict));
+    }
+    return ok;
 }
 
-// `bytes` with the checksum line set to `checksum`. The checksum line is the one holding the
-// first "# CRC:" (the one the check reads): the character after the colon and the eight after
-// it become a blank and the checksum, and what follows them on the line stays; a line with
-// fewer characters after the marker gets them in place of its rest. Without a marker, the line
-// "# CRC: <checksum>" goes first, ended like the file's first line. Every other byte, line
-// ends included, stays as it was.
-std::string WithChecksumLine(const std::string& bytes, const std::string& checksum) {
-    const std::string field = " " + checksum;
-    const std::size_t marker = bytes.find(kMarker);
-    if (marker == std::string::npos) {
-        const std::size_t firstEnd = bytes.find('\n');
-        const bool crlf =
-            firstEnd != std::string::npos && firstEnd > 0 && bytes[firstEnd - 1] == '\r';
-        return kMarker + field + (crlf ? "\r\n" : "\n") + bytes;
-    }
-    std::size_t lineEnd = bytes.find('\n', marker);
-    if (lineEnd == std::string::npos) {
-        lineEnd = bytes.size();
-    } else if (bytes[lineEnd - 1] == '\r') {
-        --lineEnd;  // the "\r" of a CR-LF end belongs to the end, not to the line
-    }
-    const std::size_t start = marker + kMarkerLength;
-    const std::size_t replaced = lineEnd - start >= field.size() ? field.size() : lineEnd - start;
-    std::string result = bytes;
-    result.replace(start, replaced, field);
-    return result;
-}
-
-bool ReadBytes(const fs::path& path, std::string& bytes) {
-    std::ifstream in(path, std::ios::binary);
-    if (!in) {
+// One checksum line: the bare checksum, or "<checksum>  <name>" (a line whose name had to be
+// escaped begins with a backslash).
+bool ChecksumOne(const std::string& name, bool bare) {
+    Tesu::ChecksumScan scan;
+    if (ScanNamed(name, scan) != 0) {
+        FailFile("checksum", name, scan.reason.str());
         return false;
     }
-    std::ostringstream buffer;
-    buffer << in.rdbuf();
-    if (in.bad()) {
-        return false;
+    if (bare) {
+        PrintLine(scan.checksum.str());
+        return true;
     }
-    bytes = buffer.str();
+    bool escaped = false;
+    const std::string shown = EscapedName(name, escaped);
+    PrintLine((escaped ? "\\" : "") + scan.checksum.str() + "  " + shown);
     return true;
 }
 
-// A name for a temporary file beside `target` that does not exist yet; empty when none is
-// found (the tool never writes over a file that is there).
-fs::path TemporaryBeside(const fs::path& target) {
-    std::random_device random;
-    std::error_code error;
-    for (int attempt = 0; attempt < 100; ++attempt) {
-        std::ostringstream name;
-        name << '.' << target.filename().string() << ".tesutil-" << std::hex << random() << random()
-             << ".tmp";
-        fs::path candidate = target.parent_path() / name.str();
-        if (!fs::exists(fs::symlink_status(candidate, error))) {
-            return candidate;
-        }
-    }
-    return fs::path();
-}
-
-// Replaces `target` by `bytes` through a temporary file beside it, which gets the target's
-// permissions and must pass the library's check before the rename. Returns what went wrong,
-// or the empty text.
-std::string ReplaceAtomically(const fs::path& target, const std::string& bytes) {
-    const fs::path temporary = TemporaryBeside(target);
-    if (temporary.empty()) {
-        return "cannot find a free name for a temporary file beside it";
-    }
-    std::error_code error;
-    auto failed = [&](const std::string& what) {
-        fs::remove(temporary, error);
-        return what;
-    };
+int RunFileList(const std::string& name, bool paths) {
+    // The list is opened here first, so that a list that cannot be read is reported once, by
+    // the tool, with the system's reason; the library then reads it and warns of each missing
+    // member.
     {
-        std::ofstream out(temporary, std::ios::binary | std::ios::trunc);
-        if (!out) {
-            return failed("cannot make the temporary file " + temporary.string());
-        }
-        out.write(bytes.data(), static_cast<std::streamsize>(bytes.size()));
-        out.close();
-        if (!out) {
-            return failed("cannot write the temporary file " + temporary.string());
+        const OpenStream probe(Port::File::open(name, Port::File::READ, true));
+        if (!probe) {
+            return FailFile("filelist", name, Port::File::lastError().str());
         }
     }
-    const fs::file_status status = fs::status(target, error);
-    if (!error) {
-        fs::permissions(temporary, status.permissions(), error);
-    }
-    if (error) {
-        return failed("cannot give the temporary file the file's permissions: " + error.message());
-    }
-    bool verdict = false;
-    if (Tesu::Utilities::ValidateFileChecksum(temporary.string(), verdict) != 0 || !verdict) {
-        return failed("the stamped text does not pass the check; the file is left as it was");
-    }
-    fs::rename(temporary, target, error);
-    if (error) {
-        return failed("cannot replace the file: " + error.message());
-    }
-    return std::string();
-}
-
-int RunVerify(const Arguments& arguments) {
-    const ParsedArguments parsed = ParseArguments(arguments, {}, {});
-    ExpectOperands(parsed, 1, SIZE_MAX, "FILE...");
-    int status = kExitOk;
-    for (const std::string& name : parsed.operands) {
-        bool verdict = false;
-        if (Tesu::Utilities::ValidateFileChecksum(name, verdict) == 0) {
-            std::cout << name << (verdict ? ": OK" : ": FAILED") << '\n';
-        } else {
-            const std::string problem = ProblemWithFile(name);
-            std::cout << name << ": " << (problem.empty() ? "cannot be read" : problem) << '\n';
-        }
-        if (!verdict) {
-            status = kExitFailed;
-        }
-    }
-    return status;
-}
-
-int RunStamp(const Arguments& arguments) {
-    const ParsedArguments parsed = ParseArguments(arguments, {}, {});
-    ExpectOperands(parsed, 1, SIZE_MAX, "FILE...");
-    int status = kExitOk;
-    for (const std::string& name : parsed.operands) {
-        std::string problem = ProblemWithFile(name);
-        std::error_code error;
-        // A symbolic link stays a link: the file it leads to is the one rewritten.
-        fs::path target = fs::path(name);
-        if (problem.empty() && fs::is_symlink(fs::symlink_status(target, error))) {
-            target = fs::canonical(target, error);
-        }
-        if (problem.empty() && !fs::is_regular_file(target, error)) {
-            problem = "is not a regular file";
-        }
-        Port::StringBase<char> content;
-        Port::StringBase<char> checksum;
-        std::string bytes;
-        if (problem.empty() &&
-            (!ReadAsChecked(target.string(), content) || !ReadBytes(target, bytes))) {
-            problem = "cannot be read";
-        }
-        if (!problem.empty()) {
-            status = Fail("stamp", name + ": " + problem);
-            continue;
-        }
-        Tesu::Utilities::CalculateChecksum(content, checksum);
-        const std::string stamped = WithChecksumLine(bytes, checksum.str());
-        if (stamped == bytes) {
-            std::cout << name << ": already stamped (" << kMarker << ' ' << checksum.str() << ")\n";
-            continue;
-        }
-        problem = ReplaceAtomically(target, stamped);
-        if (!problem.empty()) {
-            status = Fail("stamp", name + ": " + problem);
-            continue;
-        }
-        std::cout << name << ": stamped (" << kMarker << ' ' << checksum.str() << ")\n";
-    }
-    return status;
-}
-
-int RunChecksum(const Arguments& arguments) {
-    const ParsedArguments parsed = ParseArguments(arguments, {}, {});
-    ExpectOperands(parsed, 1, 1, "FILE");
-    const std::string& name = parsed.operands[0];
-    std::string problem = ProblemWithFile(name);
-    Port::StringBase<char> content;
-    if (problem.empty() && !ReadAsChecked(name, content)) {
-        problem = "cannot be read";
-    }
-    if (!problem.empty()) {
-        return Fail("checksum", name + ": " + problem);
-    }
-    Port::StringBase<char> checksum;
-    Tesu::Utilities::CalculateChecksum(content, checksum);
-    std::cout << checksum.str() << '\n';
-    return kExitOk;
-}
-
-int RunFileList(const Arguments& arguments) {
-    const ParsedArguments parsed = ParseArguments(arguments, {"--paths"}, {});
-    ExpectOperands(parsed, 1, 1, "LIST");
-    const std::string& name = parsed.operands[0];
     const Port::FileName list(name);
-    if (parsed.Has("--paths")) {
+    if (paths) {
         for (const Port::FileName& member : Tesu::Utilities::GetFileListFileNames(list)) {
-            std::cout << member.GetText().str() << '\n';
+            PrintLine(member.GetText().str());
         }
     } else {
         for (const Port::StringBase<char>& member : Tesu::Utilities::GetFileListFileStrings(list)) {
-            std::cout << member.str() << '\n';
+            PrintLine(member.str());
         }
-    }
-    // The library has said what went wrong with the list itself; the tool adds its verdict.
-    const std::string problem = ProblemWithFile(name);
-    if (!problem.empty()) {
-        return Fail("filelist", name + ": " + problem);
     }
     return kExitOk;
 }
 
 }  // namespace
 
-const std::vector<Command>& FileCommands() {
-    static const std::vector<Command> commands = {
-        {"verify", "check checksummed files against their \"# CRC:\" line",
-         "FILE...\n"
-         "  Prints \"<file>: OK\", \"<file>: FAILED\" or what is wrong with the file, one line\n"
-         "  per file. A file without a \"# CRC:\" line is OK. Exit status 1 when any file is\n"
-         "  not OK.\n",
-         RunVerify},
-        {"stamp", "write or refresh the \"# CRC:\" line of files",
-         "FILE...\n"
-         "  Sets the checksum line of each file to the checksum of its content: the line that\n"
-         "  holds the first \"# CRC:\" is refreshed in place; a file without one gets\n"
-         "  \"# CRC: <checksum>\" as its first line. Line ends are kept (CR-LF stays CR-LF).\n"
-         "  The file is replaced atomically through a temporary file beside it.\n"
-         "  Exit status 1 when any file cannot be stamped.\n",
-         RunStamp},
-        {"checksum", "print the checksum text of a file's content",
-         "FILE\n"
-         "  Prints the eight-character checksum text (\"%8x\" of the CRC-32, padded with\n"
-         "  blanks) of the file's lines that hold no \"#\", read the way verify reads them.\n",
-         RunChecksum},
-        {"filelist", "list the members of a file list",
-         "LIST [--paths]\n"
-         "  Prints the existing members of the file list LIST, one per line, cleaned (comments,\n"
-         "  blanks and doubled separators dropped, separators made the platform's). Missing\n"
-         "  members are left out with a warning.\n"
-         "  --paths  print each member joined to the list's directory instead.\n"
-         "  Exit status 1 when LIST cannot be read.\n",
-         RunFileList},
+unsigned int ScanNamed(const std::string& name, Tesu::ChecksumScan& scan) {
+    if (name != "-") {
+        return Tesu::Utilities::ScanChecksummedFile(name, scan);
+    }
+    const OpenStream input(Port::File::openStandardInput());
+    if (!input) {
+        scan.reason = Port::File::lastError();
+        return 1;
+    }
+    return Tesu::Utilities::ScanChecksummedStream(*input, scan);
+}
+
+void AddNameOptions(Command& command, NameSource& source, const char* operandHelp) {
+    AddOperand(command, "FILE", operandHelp, true);
+    source.operands = command.operands;
+    source.list = command.app
+                      ->add_option("--files-from", source.filesFrom,
+                                   "read the names from LIST, one a line (\"-\": standard input)")
+                      ->type_name("LIST");
+    command.least = 0;
+    command.most = SIZE_MAX;
+    command.names = "FILE...";
+}
+
+void CheckNames(const NameSource& source) {
+    const bool listGiven = source.list != nullptr && source.list->count() > 0;
+    if (listGiven && !source.operands->empty()) {
+        throw UsageError{"extra operand '" + source.operands->front() +
+                         "' (file operands cannot be combined with --files-from)"};
+    }
+    if (!listGiven && source.operands->empty()) {
+        throw UsageError{"missing operand (expects FILE...)"};
+    }
+}
+
+int ForEachName(const char* command, const NameSource& source,
+                const std::function<bool(const std::string& name)>& each) {
+    bool allOk = true;
+    if (source.list == nullptr || source.list->count() == 0) {
+        for (const std::string& name : *source.operands) {
+            allOk = each(name) && allOk;
+        }
+        return allOk ? kExitOk : kExitFailed;
+    }
+    const bool fromInput = source.filesFrom == "-";
+    const OpenStream list(fromInput ? Port::File::openStandardInput()
+                                    : Port::File::open(source.filesFrom, Port::File::READ, true));
+    if (!list) {
+        return FailFile(command, source.filesFrom, Port::File::lastError().str());
+    }
+    Port::StringBase<char> line;
+    while (!list->geteof()) {
+        list->readline(line);
+        if (line.IsEmpty()) {
+            continue;
+        }
+        if (fromInput && line.str() == "-") {
+            allOk = false;
+            Fail(command, "when reading file names from standard input, no file name of '-' "
+                          "allowed");
+            continue;
+        }
+        allOk = each(line.str()) && allOk;
+    }
+    const Port::StringBase<char> error = list->error();
+    if (!error.IsEmpty()) {
+        return FailFile(command, source.filesFrom, error.str());
+    }
+    return allOk ? kExitOk : kExitFailed;
+}
+
+void AddFileCommands(CLI::App& tool, Commands& commands) {
+    const char* group = "Checksummed files and file lists";
+
+    auto verify = std::make_shared<VerifyOptions>();
+    Command& verifyCommand = AddCommand(
+        tool, commands, group, "verify", "check checksummed files against their \"# CRC:\" line",
+        "Prints \"<file>: OK\" or \"<file>: FAILED\", one line per file; a file that cannot be\n"
+        "read is reported on standard error (\"tesutil verify: <file>: <reason>\"). A file\n"
+        "without a \"# CRC:\" line is OK unless --strict is given. A name holding a line\n"
+        "break or a backslash is written with \"\\n\" and \"\\\\\" and its line begins with \"\\\".\n"
+        "\"-\" is standard input. Exit status 0 when every file is OK, 1 when any FAILED or\n"
+        "cannot be read.");
+    AddNameOptions(verifyCommand, verify->names, "the files (\"-\": standard input)");
+    verifyCommand.app->add_flag("-q,--quiet", verify->quiet, "print no OK lines");
+    verifyCommand.app->add_flag("--status", verify->status,
+                                "print nothing at all, not even for a file that cannot be read: "
+                                "the exit status tells");
+    verifyCommand.app->add_flag("--strict", verify->strict,
+                                "a file without a \"# CRC:\" line fails: \"<file>: FAILED (no "
+                                "checksum line)\"");
+    verifyCommand.run = [verify] {
+        CheckNames(verify->names);
+        return ForEachName("verify", verify->names,
+                           [verify](const std::string& name) { return VerifyOne(name, *verify); });
     };
-    return commands;
+
+    AddStampCommand(tool, commands, group);
+
+    auto checksum = std::make_shared<NameSource>();
+    Command& checksumCommand = AddCommand(
+        tool, commands, group, "checksum", "print the checksum text of files' content",
+        "Prints the eight-character checksum text (\"%8x\" of the CRC-32, padded with\n"
+        "blanks) of each file's lines that hold no \"#\", read the way verify reads them.\n"
+        "With exactly one FILE operand the line holds the checksum alone; with several, or\n"
+        "with --files-from, each line is \"<checksum>  <file>\" (a name holding a line break\n"
+        "or a backslash is escaped as verify does, the line then beginning with \"\\\").\n"
+        "\"-\" is standard input. Exit status 1 when any file cannot be read.");
+    AddNameOptions(checksumCommand, *checksum, "the files (\"-\": standard input)");
+    checksumCommand.run = [checksum] {
+        CheckNames(*checksum);
+        const bool bare = checksum->list->count() == 0 && checksum->operands->size() == 1;
+        return ForEachName("checksum", *checksum,
+                           [bare](const std::string& name) { return ChecksumOne(name, bare); });
+    };
+
+    auto paths = std::make_shared<bool>(false);
+    Command& fileList = AddCommand(
+        tool, commands, group, "filelist", "list the members of a file list",
+        "Prints the existing members of the file list LIST, one per line, cleaned (comments,\n"
+        "blanks and doubled separators dropped, separators made the platform's). Missing\n"
+        "members are left out with a warning. Exit status 1 when LIST cannot be read.");
+    AddOperand(fileList, "LIST", "the file list", false);
+    fileList.app->add_flag("--paths", *paths,
+                           "print each member joined to the list's directory instead");
+    fileList.least = fileList.most = 1;
+    fileList.names = "LIST";
+    fileList.run = [paths, operands = fileList.operands] {
+        return RunFileList((*operands)[0], *paths);
+    };
 }
 
 }  // namespace tesutil

@@ -1,9 +1,14 @@
-// tesutil commands on the installation and the environment: cores-level, find, java,
+// tesutil commands on the installation and the environment: roots, cores-level, find, java,
 // version, abspath, absdir, relpath.
-#include <iostream>
+#include <memory>
 #include <string>
+#include <vector>
+
+#include <CLI/CLI.hpp>
 
 #include "Port_Env.h"
+#include "Port_File.h"
+#include "Port_PathList.h"
 #include "Port_String.h"
 #include "Tesu_IPUpdateInfo.h"
 #include "Tesu_Utilities.h"
@@ -13,18 +18,36 @@ namespace tesutil {
 
 namespace {
 
-int RunCoresLevel(const Arguments& arguments) {
-    ExpectOperands(ParseArguments(arguments, {}, {}), 0, 0, "no operands");
+// The roots in effect, one a line, each with where it came from, marked when it is not an
+// existing directory.
+int RunRoots() {
+    const Port::PathList& roots = Port::QuarnelPath::GetInstance();
+    bool any = false;
+    for (const auto& root : roots) {
+        any = true;
+        const bool there = Port::File::isdir(root);
+        PrintLine(NameLine(root.str(), "  (" + RootsOrigin() + (there ? ")" : ", missing)")));
+    }
+    if (!any) {
+        return Fail("roots", "no installation roots (" + RootsOrigin() + " gives none)");
+    }
+    return kExitOk;
+}
+
+int RunCoresLevel() {
     Port::StringBase<char> report;
     const unsigned int result = Tesu::IPUpdateInfo::GetCoresLevel(report);
     switch (result) {
         case 3:
-            std::cout << report.str() << '\n';
+            PrintLine(report.str());
             return kExitOk;
         case 1:
-            return Fail("cores-level", "no installation root holds a readable IPupdate.log");
+            return Fail("cores-level",
+                        "no installation root holds a readable IPupdate.log (looked in " +
+                            RootsLookedIn() + ")");
         case 2:
-            return Fail("cores-level", "the update log IPupdate.log cannot be opened");
+            // The library has named the log and said that it does not open.
+            return kExitFailed;
         case 4:
             return Fail("cores-level", "the update log IPupdate.log holds no cores_level= line");
         default:
@@ -32,122 +55,135 @@ int RunCoresLevel(const Arguments& arguments) {
     }
 }
 
-int RunFind(const Arguments& arguments) {
-    const ParsedArguments parsed = ParseArguments(arguments, {"--container"}, {});
-    ExpectOperands(parsed, 1, 1, "NAME");
-    const std::string& name = parsed.operands[0];
+int RunFind(const std::string& name, bool container) {
     Port::StringBase<char> path;
-    if (parsed.Has("--container")) {
+    if (container) {
         if (Tesu::Utilities::GetFullQuarnelPathWithContainer(name, path)) {
-            std::cout << path.str() << '\n';
+            PrintLine(path.str());
             return kExitOk;
         }
-        return Fail("find",
-                    "'" + name + "' not found in the IP container of any installation root");
+        return Fail("find", "'" + name +
+                                "' not found in the IP container of any installation root "
+                                "(looked in " +
+                                RootsLookedIn() + ")");
     }
     if (Tesu::Utilities::GetFullQuarnelPathOf(name, path)) {
-        std::cout << path.str() << '\n';
+        PrintLine(path.str());
         return kExitOk;
     }
-    return Fail("find", "'" + name + "' not found under the installation roots");
+    return Fail("find", "'" + name + "' not found under the installation roots (looked in " +
+                            RootsLookedIn() + ")");
 }
 
-int RunJava(const Arguments& arguments) {
-    ExpectOperands(ParseArguments(arguments, {}, {}), 0, 0, "no operands");
+int RunJava() {
     Port::StringBase<char> path;
     if (Tesu::Utilities::GetJavaExecutablePath(path)) {
-        std::cout << path.str() << '\n';
+        PrintLine(path.str());
         return kExitOk;
     }
     return Fail("java", "no Java runtime java/" + Port_Env::GetPlatformPath().str() +
-                            "/jre/bin/java under the installation roots");
+                            "/jre/bin/java under the installation roots (looked in " +
+                            RootsLookedIn() + ")");
 }
 
-int RunVersion(const Arguments& arguments) {
-    ExpectOperands(ParseArguments(arguments, {}, {}), 0, 0, "no operands");
-    std::cout << "name: " << Tesu::Utilities::ApplicationName().str() << '\n'
-              << "version: " << Tesu::Utilities::RevisionVersion().str() << '\n'
-              << "built: " << Tesu::Utilities::GetBuildDate() << ' '
-              << Tesu::Utilities::GetBuildTime() << '\n'
-              << "next major release: " << Tesu::Utilities::NextMajorRelease().str() << '\n';
+int RunVersion() {
+    PrintLine("name: " + Tesu::Utilities::ApplicationName().str());
+    PrintLine("version: " + Tesu::Utilities::RevisionVersion().str());
+    PrintLine(std::string("built: ") + Tesu::Utilities::GetBuildDate() + ' ' +
+              Tesu::Utilities::GetBuildTime());
+    PrintLine("next major release: " + Tesu::Utilities::NextMajorRelease().str());
     return kExitOk;
 }
 
 // The one operand PATH, which must not be empty.
-std::string PathOperand(const Arguments& arguments) {
-    const ParsedArguments parsed = ParseArguments(arguments, {}, {});
-    ExpectOperands(parsed, 1, 1, "PATH");
-    if (parsed.operands[0].empty()) {
+const std::string& PathOperand(const std::vector<std::string>& operands, std::size_t index) {
+    if (operands[index].empty()) {
         throw UsageError{"PATH is empty"};
     }
-    return parsed.operands[0];
-}
-
-int RunAbsPath(const Arguments& arguments) {
-    std::cout << Tesu::Utilities::GetAbsolutePath(PathOperand(arguments)).str() << '\n';
-    return kExitOk;
-}
-
-int RunAbsDir(const Arguments& arguments) {
-    std::cout << Tesu::Utilities::GetAbsoluteDirectory(PathOperand(arguments)).str() << '\n';
-    return kExitOk;
-}
-
-int RunRelPath(const Arguments& arguments) {
-    const ParsedArguments parsed = ParseArguments(arguments, {}, {});
-    ExpectOperands(parsed, 2, 2, "BASE PATH");
-    if (parsed.operands[1].empty()) {
-        throw UsageError{"PATH is empty"};
-    }
-    std::cout << Tesu::Utilities::MakeRelativePath(parsed.operands[0], parsed.operands[1]).str()
-              << '\n';
-    return kExitOk;
+    return operands[index];
 }
 
 }  // namespace
 
-const std::vector<Command>& InstallationCommands() {
-    static const std::vector<Command> commands = {
-        {"cores-level", "show the level of the last IP core update",
-         "\n"
-         "  Prints \"Cores Update # <level>\" from the first line holding \"cores_level=\" in\n"
-         "  the first readable IPupdate.log among the installation roots. Exit status 1 when\n"
-         "  there is no such log or line.\n",
-         RunCoresLevel},
-        {"find", "find a file or directory under the installation roots",
-         "NAME [--container]\n"
-         "  Prints the absolute path of NAME under the first installation root that holds it.\n"
-         "  --container  look inside each entry of the IP container tessel/ip/quarnel of each\n"
-         "               root instead (entries in name order; the first match wins).\n"
-         "  Exit status 1 when NAME is not found.\n",
-         RunFind},
-        {"java", "show the Java runtime shipped with the installation",
-         "\n"
-         "  Prints the absolute path of java/<platform>/jre/bin/java under the first\n"
-         "  installation root that holds it. Exit status 1 when there is none.\n",
-         RunJava},
-        {"version", "show the application's name, version, build stamp and next major release",
-         "\n"
-         "  Prints the application name, the version value, the library's build date and\n"
-         "  time, and the next major release.\n",
-         RunVersion},
-        {"abspath", "make a path absolute",
-         "PATH\n"
-         "  Prints PATH absolute and normalised, ending in a separator when it is an existing\n"
-         "  directory. Symbolic links are not resolved.\n",
-         RunAbsPath},
-        {"absdir", "show the absolute directory a path denotes",
-         "PATH\n"
-         "  Prints the absolute directory PATH denotes, ending in a separator: PATH itself\n"
-         "  when it is a directory, else (a file, or a name that does not exist) its parent.\n",
-         RunAbsDir},
-        {"relpath", "express a path relative to a base directory",
-         "BASE PATH\n"
-         "  Prints PATH as \"./\" and the rest when it lies under the directory BASE denotes\n"
-         "  (see absdir), else its absolute form. Never produces \"..\".\n",
-         RunRelPath},
+void AddInstallationCommands(CLI::App& tool, Commands& commands) {
+    const char* group = "Installation and paths";
+    auto add = [&](const char* name, const char* summary, const char* description) -> Command& {
+        return AddCommand(tool, commands, group, name, summary, description);
     };
-    return commands;
+
+    add("roots", "show the installation roots in effect",
+        "Prints each installation root, in search order, followed by two blanks and where\n"
+        "it came from in parentheses: --roots, TESSEL_ROOTS, sample installation or\n"
+        "installation prefix; \", missing\" is added for a root that is not an existing\n"
+        "directory. Exit status 1 when there are no roots.")
+        .run = RunRoots;
+
+    add("cores-level", "show the level of the last IP core update",
+        "Prints \"Cores Update # <level>\" from the first line holding \"cores_level=\" in\n"
+        "the first readable IPupdate.log among the installation roots. Exit status 1 when\n"
+        "there is no such log or line.")
+        .run = RunCoresLevel;
+
+    auto container = std::make_shared<bool>(false);
+    Command& find =
+        add("find", "find a file or directory under the installation roots",
+            "Prints the absolute path of NAME under the first installation root that holds it.\n"
+            "Exit status 1 when NAME is not found; the message names the roots looked in.");
+    AddOperand(find, "NAME", "the name, relative to a root", false);
+    find.app->add_flag("--container", *container,
+                       "look inside each entry of the IP container tessel/ip/quarnel of each "
+                       "root instead (entries in name order; the first match wins)");
+    find.least = find.most = 1;
+    find.names = "NAME";
+    find.run = [container, operands = find.operands] { return RunFind((*operands)[0], *container); };
+
+    add("java", "show the Java runtime shipped with the installation",
+        "Prints the absolute path of java/<platform>/jre/bin/java under the first\n"
+        "installation root that holds it. Exit status 1 when there is none.")
+        .run = RunJava;
+
+    add("version", "show the application's name, version, build stamp and next major release",
+        "Prints the application name, the version value, the library's build date and\n"
+        "time, and the next major release (tesutil --version prints the tool's own\n"
+        "version).")
+        .run = RunVersion;
+
+    Command& abspath = add("abspath", "make a path absolute",
+                           "Prints PATH absolute and normalised, ending in a separator when it is "
+                           "an existing\ndirectory. Symbolic links are not resolved.");
+    AddOperand(abspath, "PATH", "the path", false);
+    abspath.least = abspath.most = 1;
+    abspath.names = "PATH";
+    abspath.run = [operands = abspath.operands] {
+        PrintLine(Tesu::Utilities::GetAbsolutePath(PathOperand(*operands, 0)).str());
+        return kExitOk;
+    };
+
+    Command& absdir =
+        add("absdir", "show the absolute directory a path denotes",
+            "Prints the absolute directory PATH denotes, ending in a separator: PATH itself\n"
+            "when it is a directory, else (a file, or a name that does not exist) its parent.");
+    AddOperand(absdir, "PATH", "the path", false);
+    absdir.least = absdir.most = 1;
+    absdir.names = "PATH";
+    absdir.run = [operands = absdir.operands] {
+        PrintLine(Tesu::Utilities::GetAbsoluteDirectory(PathOperand(*operands, 0)).str());
+        return kExitOk;
+    };
+
+    Command& relpath = add("relpath", "express a path relative to a base directory",
+                           "Prints PATH as \"./\" and the rest when it lies under the directory "
+                           "BASE denotes\n(see absdir), else its absolute form. Never produces "
+                           "\"..\".");
+    AddOperand(relpath, "BASE", "the base directory", false);
+    AddOperand(relpath, "PATH", "the path", false);
+    relpath.least = relpath.most = 2;
+    relpath.names = "BASE PATH";
+    relpath.run = [operands = relpath.operands] {
+        PrintLine(
+            Tesu::Utilities::MakeRelativePath((*operands)[0], PathOperand(*operands, 1)).str());
+        return kExitOk;
+    };
 }
 
 }  // namespace tesutil

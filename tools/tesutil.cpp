@@ -1,21 +1,27 @@
 // tesutil: the command-line tool over libTesu_Utilities.
 //
 //   tesutil [--roots DIR[:DIR...]] [--debug LEVEL] [--diag LEVEL] <command> [arguments]
-//   tesutil --help | tesutil <command> --help
+//   tesutil --help | tesutil --version | tesutil <command> --help
 //
-// Exit status: 0 on success, 1 when a check fails or a thing is not found, 2 on bad usage.
+// Exit status: 0 on success, 1 when a check fails, a thing is not found or output fails, 2 on
+// bad usage.
 //
-// This file holds the dispatch, the global options and the argument parsing; the commands
-// live in commands_*.cpp. The tool makes one Tesu::MsgMan for its lifetime, so that the
-// library's messages reach the standard error stream ("ERROR:tesutil - ...").
-#include <cstdint>
-#include <cstdlib>
+// This file holds the command line (parsed with CLI11), the global options, the installation
+// roots and the checked output; the commands live in commands_*.cpp. The tool makes one
+// Tesu::MsgMan for its lifetime, so that the library's messages reach the standard error
+// stream ("ERROR:tesutil - ...").
+#include <algorithm>
+#include <cerrno>
+#include <cstdio>
+#include <cstring>
 #include <exception>
 #include <filesystem>
 #include <iostream>
 #include <string>
 #include <system_error>
 #include <vector>
+
+#include <CLI/CLI.hpp>
 
 #include "Port_Env.h"
 #include "Port_PathList.h"
@@ -27,6 +33,9 @@
 #ifndef TESUTIL_SAMPLE_FROM_EXE
 #define TESUTIL_SAMPLE_FROM_EXE "../share/tesu/examples/installation"
 #endif
+#ifndef TESUTIL_VERSION
+#define TESUTIL_VERSION "unknown"
+#endif
 
 namespace tesutil {
 
@@ -34,132 +43,152 @@ namespace {
 
 namespace fs = std::filesystem;
 
+const char kVersionText[] =
+    "tesutil " TESUTIL_VERSION
+    "\n"
+    "There is NO WARRANTY, to the extent permitted by law.";
+
 struct GlobalOptions {
-    bool help = false;
-    bool rootsGiven = false;
     std::string roots;
-    bool debugGiven = false;
-    Tesu::DebugMessenger::DebugLevel debug = Tesu::DebugMessenger::DEBUG_OFF;
-    Tesu::MsgMan::DiagnosticLevel diag = Tesu::MsgMan::DIAG_STANDARD;
+    std::string debug;
+    std::string diag = "standard";
 };
 
 bool gDebugLevelGiven = false;
+std::string gRootsOrigin;
 
-Tesu::MsgMan::DiagnosticLevel ParseDiagLevel(const std::string& text) {
-    if (text == "silent") {
-        return Tesu::MsgMan::DIAG_SILENT;
-    }
-    if (text == "reduced") {
-        return Tesu::MsgMan::DIAG_REDUCED;
-    }
-    if (text == "standard") {
-        return Tesu::MsgMan::DIAG_STANDARD;
-    }
-    if (text == "full") {
-        return Tesu::MsgMan::DIAG_FULL;
-    }
-    throw UsageError{"unknown diagnostic level '" + text + "' (silent, reduced, standard, full)"};
-}
+const std::vector<std::string> kDebugLevels = {"off", "normal", "detailed", "verbose"};
+const std::vector<std::string> kDiagLevels = {"silent", "reduced", "standard", "full"};
 
-// Reads the global options in front of the command; returns the index of the command name
-// (arguments.size() when there is none).
-std::size_t ParseGlobalOptions(const Arguments& arguments, GlobalOptions& options) {
-    std::size_t index = 0;
-    while (index < arguments.size()) {
-        const std::string& argument = arguments[index];
-        if (argument == "--help" || argument == "-h") {
-            options.help = true;
-            ++index;
-            continue;
-        }
-        if (argument.size() < 2 || argument[0] != '-') {
-            break;  // the command
-        }
-        std::string name = argument;
-        std::string value;
-        bool hasValue = false;
-        const std::size_t equals = argument.find('=');
-        if (equals != std::string::npos) {
-            name = argument.substr(0, equals);
-            value = argument.substr(equals + 1);
-            hasValue = true;
-        }
-        if (name != "--roots" && name != "--debug" && name != "--diag") {
-            throw UsageError{"unknown option '" + argument + "'"};
-        }
-        if (!hasValue) {
-            if (index + 1 >= arguments.size()) {
-                throw UsageError{"option " + name + " needs a value"};
+// A CLI11 check that a value is one of `names`; `what` names the kind in the message.
+CLI::Validator OneOf(const std::string& what, const std::vector<std::string>& names) {
+    return CLI::Validator(
+        [what, names](std::string& value) -> std::string {
+            if (std::find(names.begin(), names.end(), value) != names.end()) {
+                return std::string();
             }
-            value = arguments[++index];
-        }
-        ++index;
-        if (name == "--roots") {
-            options.rootsGiven = true;
-            options.roots = value;
-        } else if (name == "--debug") {
-            options.debugGiven = true;
-            options.debug = ParseDebugLevel(value);
-        } else {
-            options.diag = ParseDiagLevel(value);
-        }
-    }
-    return index;
+            std::string list;
+            for (const std::string& name : names) {
+                list += (list.empty() ? "" : ", ") + name;
+            }
+            return "unknown " + what + " '" + value + "' (" + list + ")";
+        },
+        "");
 }
 
-std::vector<Command> AllCommands() {
-    std::vector<Command> all;
-    for (const auto* group : {&FileCommands(), &InstallationCommands(), &DebugCommands()}) {
-        all.insert(all.end(), group->begin(), group->end());
-    }
-    return all;
+Tesu::MsgMan::DiagnosticLevel DiagLevelOf(const std::string& name) {
+    const auto at = std::find(kDiagLevels.begin(), kDiagLevels.end(), name);
+    return static_cast<Tesu::MsgMan::DiagnosticLevel>(at - kDiagLevels.begin());
 }
 
-const Command* FindCommand(const std::vector<Command>& commands, const std::string& name) {
-    for (const Command& command : commands) {
-        if (name == command.name) {
-            return &command;
+// CLI11's help, with no line ending in a blank and no blank lines at the end.
+class HelpFormatter : public CLI::Formatter {
+  public:
+    std::string make_help(const CLI::App* app, std::string name,
+                          CLI::AppFormatMode mode) const override {
+        const std::string text = CLI::Formatter::make_help(app, std::move(name), mode);
+        std::string result;
+        std::size_t start = 0;
+        while (start < text.size()) {
+            std::size_t end = text.find('\n', start);
+            if (end == std::string::npos) {
+                end = text.size();
+            }
+            std::size_t last = end;
+            while (last > start && (text[last - 1] == ' ' || text[last - 1] == '\t')) {
+                --last;
+            }
+            result.append(text, start, last - start);
+            result += '\n';
+            start = end + 1;
         }
+        while (result.size() > 1 && result[result.size() - 1] == '\n' &&
+               result[result.size() - 2] == '\n') {
+            result.pop_back();
+        }
+        return result;
+    }
+};
+
+// The option of `app` whose long name is `name` ("--name"), or the only one it begins, as
+// getopt_long accepts; null when there is none. An ambiguous beginning is a UsageError.
+const CLI::Option* FindLongOption(const CLI::App& app, std::string& name) {
+    const std::string wanted = name.substr(2);
+    std::vector<std::pair<std::string, const CLI::Option*>> matches;
+    for (const CLI::Option* option : app.get_options()) {
+        for (const std::string& longName : option->get_lnames()) {
+            if (longName == wanted) {
+                return option;
+            }
+            if (longName.compare(0, wanted.size(), wanted) == 0) {
+                matches.emplace_back(longName, option);
+            }
+        }
+    }
+    if (matches.size() == 1) {
+        name = "--" + matches.front().first;
+        return matches.front().second;
+    }
+    if (matches.size() > 1) {
+        std::string possibilities;
+        for (const auto& match : matches) {
+            possibilities += " '--" + match.first + "'";
+        }
+        throw UsageError{"option '" + name + "' is ambiguous; possibilities:" + possibilities};
     }
     return nullptr;
 }
 
-void PrintUsage(std::ostream& out, const std::vector<Command>& commands) {
-    out << "usage: tesutil [global options] <command> [arguments]\n"
-           "       tesutil <command> --help\n"
-           "global options (before the command):\n"
-           "  --roots DIR[:DIR...]  installation roots, in search order (\";\" between them on\n"
-           "                        Windows); default: TESSEL_ROOTS when it is set, else the\n"
-           "                        sample installation "
-        << TESUTIL_SAMPLE_FROM_EXE
-        << "\n"
-           "                        (relative to the directory of the tesutil executable)\n"
-           "  --debug LEVEL         root logger level: off (default), normal, detailed, verbose\n"
-           "  --diag LEVEL          messages on standard error: silent, reduced, standard\n"
-           "                        (default), full\n"
-           "commands:\n";
-    for (const Command& command : commands) {
-        std::string name = command.name;
-        name.resize(14, ' ');
-        out << "  " << name << command.summary << '\n';
+// The command line made ready for CLI11: unique beginnings of long options completed, and
+// the arguments after the command's "--" taken out into `tail` (they are operands whatever
+// they look like). `command` is set to the command named, or null. Unknown options and
+// commands are left for CLI11 and the checks after it.
+std::vector<std::string> Prepare(const CLI::App& tool, const std::vector<std::string>& all,
+                                 const CLI::App*& command, std::vector<std::string>& tail) {
+    std::vector<std::string> prepared;
+    const CLI::App* current = &tool;
+    command = nullptr;
+    for (std::size_t index = 0; index < all.size(); ++index) {
+        std::string argument = all[index];
+        if (argument == "--" && command != nullptr) {
+            tail.assign(all.begin() + static_cast<std::ptrdiff_t>(index) + 1, all.end());
+            break;
+        }
+        if (argument.size() > 2 && argument.compare(0, 2, "--") == 0) {
+            const std::size_t equals = argument.find('=');
+            std::string name = argument.substr(0, equals);
+            const CLI::Option* option = FindLongOption(*current, name);
+            const bool takesValue = option != nullptr && option->get_type_size() > 0;
+            prepared.push_back(equals == std::string::npos ? name : name + argument.substr(equals));
+            if (takesValue && equals == std::string::npos && index + 1 < all.size()) {
+                prepared.push_back(all[++index]);
+            }
+            continue;
+        }
+        if (argument.size() > 1 && argument[0] == '-') {
+            prepared.push_back(argument);
+            continue;
+        }
+        if (command == nullptr) {
+            try {
+                command = tool.get_subcommand(argument);
+                current = command;
+            } catch (const CLI::OptionNotFound&) {
+                // An unknown command: reported after parsing.
+            }
+        }
+        prepared.push_back(argument);
     }
-    out << "exit status: 0 success, 1 a check failed or a thing was not found, 2 bad usage\n";
+    return prepared;
 }
 
-void PrintCommandUsage(std::ostream& out, const Command& command) {
-    out << "usage: tesutil " << command.name << ' ' << command.usage;
-}
-
-bool AsksForHelp(const Arguments& arguments) {
-    for (const std::string& argument : arguments) {
-        if (argument == "--") {
-            return false;
-        }
-        if (argument == "--help" || argument == "-h") {
-            return true;
-        }
+// The first argument CLI11 left over, as a usage message.
+std::string Leftover(const std::vector<std::string>& remaining, const std::string& expects) {
+    const std::string& first = remaining.front();
+    if (first.size() > 1 && first[0] == '-') {
+        return "unknown option '" + first + "'";
     }
-    return false;
+    return "extra operand '" + first + "'" + expects;
 }
 
 // The tool's own executable, absolute; empty when it cannot be found.
@@ -194,16 +223,19 @@ fs::path ExecutablePath(const char* argv0) {
 // The installation roots: --roots when given, else TESSEL_ROOTS (the layer reads it), else
 // the sample installation beside the executable. When the sample is not there either, the
 // layer's own default stays (the installation prefix of the libraries).
-void SetInstallationRoots(const GlobalOptions& options, const char* argv0) {
+void SetInstallationRoots(const CLI::App& tool, const GlobalOptions& options, const char* argv0) {
     const char separator = Port::QuarnelPath::GetListSeparator();
-    if (options.rootsGiven) {
+    if (tool.count("--roots") > 0) {
+        gRootsOrigin = "--roots";
         Port::QuarnelPath::SetRoots(Port::PathList(options.roots, separator));
         return;
     }
     Port::StringBase<char> fromEnvironment;
     if (Port_Env::GetVariable("TESSEL_ROOTS", fromEnvironment)) {
+        gRootsOrigin = "TESSEL_ROOTS";
         return;
     }
+    gRootsOrigin = "installation prefix";
     const fs::path executable = ExecutablePath(argv0);
     if (executable.empty()) {
         return;
@@ -217,91 +249,116 @@ void SetInstallationRoots(const GlobalOptions& options, const char* argv0) {
         Port::PathList roots;
         roots.Append(error ? sample.string() : real.string());
         Port::QuarnelPath::SetRoots(roots);
+        gRootsOrigin = "sample installation";
     }
+}
+
+void PrintUsageError(const std::string& command, const std::string& message) {
+    const std::string who = command.empty() ? "tesutil" : "tesutil " + command;
+    std::cerr << who << ": " << message << "; " << who << " --help shows the usage" << std::endl;
 }
 
 }  // namespace
 
-Tesu::DebugMessenger::DebugLevel ParseDebugLevel(const std::string& text) {
-    if (text == "off") {
-        return Tesu::DebugMessenger::DEBUG_OFF;
-    }
-    if (text == "normal") {
-        return Tesu::DebugMessenger::DEBUG_NORMAL;
-    }
-    if (text == "detailed") {
-        return Tesu::DebugMessenger::DEBUG_DETAILED;
-    }
-    if (text == "verbose") {
-        return Tesu::DebugMessenger::DEBUG_VERBOSE;
-    }
-    throw UsageError{"unknown debug level '" + text + "' (off, normal, detailed, verbose)"};
+CLI::Validator DebugLevelCheck() {
+    return OneOf("debug level", kDebugLevels);
+}
+
+Tesu::DebugMessenger::DebugLevel DebugLevelOf(const std::string& name) {
+    const auto at = std::find(kDebugLevels.begin(), kDebugLevels.end(), name);
+    return static_cast<Tesu::DebugMessenger::DebugLevel>(Tesu::DebugMessenger::DEBUG_OFF +
+                                                         (at - kDebugLevels.begin()));
 }
 
 bool GlobalDebugLevelGiven() {
     return gDebugLevelGiven;
 }
 
-ParsedArguments ParseArguments(const Arguments& arguments, std::initializer_list<const char*> flags,
-                               std::initializer_list<const char*> valueOptions) {
-    auto known = [](std::initializer_list<const char*> names, const std::string& name) {
-        for (const char* candidate : names) {
-            if (name == candidate) {
-                return true;
-            }
-        }
-        return false;
-    };
-    ParsedArguments parsed;
-    bool optionsEnded = false;
-    for (std::size_t index = 0; index < arguments.size(); ++index) {
-        const std::string& argument = arguments[index];
-        if (optionsEnded || argument.size() < 2 || argument[0] != '-') {
-            parsed.operands.push_back(argument);
-            continue;
-        }
-        if (argument == "--") {
-            optionsEnded = true;
-            continue;
-        }
-        std::string name = argument;
-        std::string value;
-        bool hasValue = false;
-        const std::size_t equals = argument.find('=');
-        if (argument.compare(0, 2, "--") == 0 && equals != std::string::npos) {
-            name = argument.substr(0, equals);
-            value = argument.substr(equals + 1);
-            hasValue = true;
-        }
-        if (known(flags, name)) {
-            if (hasValue) {
-                throw UsageError{"option " + name + " takes no value"};
-            }
-            parsed.flags.insert(name);
-        } else if (known(valueOptions, name)) {
-            if (!hasValue) {
-                if (index + 1 >= arguments.size()) {
-                    throw UsageError{"option " + name + " needs a value"};
-                }
-                value = arguments[++index];
-            }
-            parsed.values[name] = value;
-        } else {
-            throw UsageError{"unknown option '" + argument + "'"};
-        }
-    }
-    return parsed;
+const std::string& RootsOrigin() {
+    return gRootsOrigin;
 }
 
-void ExpectOperands(const ParsedArguments& parsed, std::size_t least, std::size_t most,
-                    const char* names) {
-    const std::size_t count = parsed.operands.size();
-    if (count < least) {
-        throw UsageError{std::string("missing operand (expects ") + names + ")"};
+std::string RootsLookedIn() {
+    std::string list;
+    for (const auto& root : Port::QuarnelPath::GetInstance()) {
+        list += (list.empty() ? "" : std::string(1, Port::QuarnelPath::GetListSeparator())) +
+                root.str();
     }
-    if (count > most) {
-        throw UsageError{"extra operand '" + parsed.operands[most] + "' (expects " + names + ")"};
+    return list.empty() ? "no installation roots" : list;
+}
+
+Command& AddCommand(CLI::App& tool, Commands& commands, const char* group, const char* name,
+                    const char* summary, const char* description) {
+    CLI::App* app = tool.add_subcommand(name, summary);
+    app->group(group);
+    app->footer(description);
+    commands.emplace_back();
+    commands.back().app = app;
+    return commands.back();
+}
+
+void AddOperand(Command& command, const char* name, const char* help, bool many) {
+    if (!command.operands) {
+        command.operands = std::make_shared<std::vector<std::string>>();
     }
+    std::shared_ptr<std::vector<std::string>> operands = command.operands;
+    if (many) {
+        command.app
+            ->add_option_function<std::vector<std::string>>(
+                name,
+                [operands](const std::vector<std::string>& values) {
+                    operands->insert(operands->end(), values.begin(), values.end());
+                },
+                help)
+            ->type_name("");
+    } else {
+        command.app
+            ->add_option_function<std::string>(
+                name, [operands](const std::string& value) { operands->push_back(value); },
+                help)
+            ->type_name("");
+    }
+}
+
+void Print(const std::string& text) {
+    errno = 0;
+    const bool written = std::fwrite(text.data(), 1, text.size(), stdout) == text.size();
+    if (!written || std::fflush(stdout) != 0 || std::ferror(stdout) != 0) {
+        const int error = errno;
+        throw WriteError{error != 0 ? std::strerror(error) : "cannot write to standard output"};
+    }
+}
+
+void PrintLine(const std::string& line) {
+    Print(line + '\n');
+}
+
+void FinishOutput() {
+    Print(std::string());
+}
+
+std::string EscapedName(const std::string& name, bool& escaped) {
+    escaped = name.find_first_of("\n\\") != std::string::npos;
+    if (!escaped) {
+        return name;
+    }
+    std::string result;
+    for (const char c : name) {
+        if (c == '\n') {
+            result += "\\n";
+        } else if (c == '\\') {
+            result += "\\\\";
+        } else {
+            result += c;
+        }
+    }
+    return result;
+}
+
+std::string NameLine(const std::string& name, const std::string& suffix) {
+    bool escaped = false;
+    const std::string shown = EscapedName(name, escaped);
+    return (escaped ? "\\" : "") + shown + suffix;
 }
 
 int Fail(const char* command, const std::string& message) {
@@ -309,60 +366,147 @@ int Fail(const char* command, const std::string& message) {
     return kExitFailed;
 }
 
+int FailFile(const char* command, const std::string& name, const std::string& reason) {
+    bool escaped = false;
+    return Fail(command, EscapedName(name, escaped) + ": " + reason);
+}
+
 }  // namespace tesutil
 
 int main(int argc, char** argv) {
     using namespace tesutil;
-    // Results go out line by line, so that they keep their place among the messages on the
-    // standard error stream when both go to one terminal or file.
-    std::cout.setf(std::ios::unitbuf);
 
-    const std::vector<Command> commands = AllCommands();
-    const Arguments all(argv + 1, argv + argc);
+    CLI::App tool("tesutil: the command-line tool over libTesu_Utilities", "tesutil");
+    tool.formatter(std::make_shared<HelpFormatter>());
+    tool.get_formatter()->column_width(28);
+    tool.get_formatter()->label("REQUIRED", "");
+    tool.allow_extras();
+    tool.require_subcommand(0, 1);
+    tool.set_version_flag("--version", kVersionText, "print the tool's version and exit");
+    tool.set_help_flag("-h,--help", "print this help and exit");
+    tool.footer(
+        "Global options come before the command; `tesutil <command> --help` shows one command.\n"
+        "Long options may be shortened to any unique beginning.\n"
+        "Roots: --roots when given, else TESSEL_ROOTS when it is set (even to nothing), else\n"
+        "the sample installation " TESUTIL_SAMPLE_FROM_EXE
+        " (relative to the directory of\n"
+        "the tesutil executable), else the installation prefix; `tesutil roots` shows them.\n"
+        "Exit status: 0 success, 1 a check failed, a thing was not found or output failed,\n"
+        "2 bad usage.");
     GlobalOptions options;
-    std::size_t commandIndex = 0;
+    tool.add_option("--roots", options.roots,
+                    "installation roots, in search order (\";\" between them on Windows)")
+        ->type_name("DIR[:DIR...]");
+    tool.add_option("--debug", options.debug,
+                    "root logger level: off (default), normal, detailed, verbose")
+        ->type_name("LEVEL")
+        ->check(DebugLevelCheck());
+    tool.add_option("--diag", options.diag,
+                    "library messages on standard error: silent, reduced, standard (default), "
+                    "full")
+        ->type_name("LEVEL")
+        ->check(OneOf("diagnostic level", kDiagLevels));
+
+    Commands commands;
+    AddFileCommands(tool, commands);
+    AddInstallationCommands(tool, commands);
+    AddDebugCommands(tool, commands);
+    for (Command& command : commands) {
+        command.app->allow_extras();
+        command.app->formatter(tool.get_formatter());
+        command.app->set_help_flag("-h,--help", "print this help and exit");
+    }
+
+    const std::vector<std::string> all(argv + 1, argv + argc);
+    const CLI::App* named = nullptr;
+    const Command* command = nullptr;
     try {
-        commandIndex = ParseGlobalOptions(all, options);
+        std::vector<std::string> tail;
+        std::vector<std::string> prepared = Prepare(tool, all, named, tail);
+        std::reverse(prepared.begin(), prepared.end());
+        tool.parse(prepared);
+        const std::vector<std::string> leftover = tool.remaining();
+        const std::vector<CLI::App*> selected = tool.get_subcommands();
+        if (selected.empty()) {
+            named = nullptr;
+            if (leftover.empty() || (leftover.front().size() > 1 && leftover.front()[0] == '-')) {
+                if (!leftover.empty()) {
+                    throw UsageError{Leftover(leftover, "")};
+                }
+                std::cerr << "tesutil: no command given; tesutil --help lists the commands\n";
+            } else {
+                std::cerr << "tesutil: unknown command '" << leftover.front()
+                          << "'; tesutil --help lists the commands\n";
+            }
+            return kExitUsage;
+        }
+        if (!leftover.empty()) {
+            named = nullptr;  // a global option the tool does not know
+            throw UsageError{Leftover(leftover, "")};
+        }
+        for (const Command& candidate : commands) {
+            if (candidate.app == selected.front()) {
+                command = &candidate;
+            }
+        }
+        named = command->app;
+        const std::string expects = std::string(" (expects ") + command->names + ")";
+        const std::vector<std::string> extras = command->app->remaining();
+        if (!extras.empty()) {
+            throw UsageError{Leftover(extras, expects)};
+        }
+        std::vector<std::string> none;
+        std::vector<std::string>& operands = command->operands ? *command->operands : none;
+        operands.insert(operands.end(), tail.begin(), tail.end());
+        if (operands.size() < command->least) {
+            throw UsageError{"missing operand" + expects};
+        }
+        if (operands.size() > command->most) {
+            throw UsageError{"extra operand '" + operands[command->most] + "'" + expects};
+        }
+    } catch (const CLI::CallForHelp&) {
+        try {
+            Print(tool.help());
+        } catch (const WriteError& error) {
+            std::cerr << "tesutil: write error: " << error.reason << std::endl;
+            return kExitFailed;
+        }
+        return kExitOk;
+    } catch (const CLI::CallForVersion& version) {
+        try {
+            PrintLine(version.what());
+        } catch (const WriteError& error) {
+            std::cerr << "tesutil: write error: " << error.reason << std::endl;
+            return kExitFailed;
+        }
+        return kExitOk;
     } catch (const UsageError& error) {
-        std::cerr << "tesutil: " << error.message << "; tesutil --help shows the usage\n";
+        PrintUsageError(named != nullptr ? named->get_name() : "", error.message);
         return kExitUsage;
-    }
-    if (options.help) {
-        PrintUsage(std::cout, commands);
-        return kExitOk;
-    }
-    if (commandIndex >= all.size()) {
-        std::cerr << "tesutil: no command given; tesutil --help lists the commands\n";
+    } catch (const CLI::ParseError& error) {
+        PrintUsageError(named != nullptr ? named->get_name() : "", error.what());
         return kExitUsage;
-    }
-    const Command* command = FindCommand(commands, all[commandIndex]);
-    if (command == nullptr) {
-        std::cerr << "tesutil: unknown command '" << all[commandIndex]
-                  << "'; tesutil --help lists the commands\n";
-        return kExitUsage;
-    }
-    const Arguments arguments(all.begin() + static_cast<std::ptrdiff_t>(commandIndex) + 1,
-                              all.end());
-    if (AsksForHelp(arguments)) {
-        PrintCommandUsage(std::cout, *command);
-        return kExitOk;
     }
 
     try {
-        SetInstallationRoots(options, argc > 0 ? argv[0] : nullptr);
-        if (options.debugGiven) {
-            Tesu::DebugMessengerFactory::GetLogger()->SetLevel(options.debug);
+        SetInstallationRoots(tool, options, argc > 0 ? argv[0] : nullptr);
+        gDebugLevelGiven = tool.count("--debug") > 0;
+        if (gDebugLevelGiven) {
+            Tesu::DebugMessengerFactory::GetLogger()->SetLevel(DebugLevelOf(options.debug));
         }
-        gDebugLevelGiven = options.debugGiven;
         // Every message of the library reaches the standard error stream through this manager,
         // filtered by the diagnostic level, until the tool ends.
-        Tesu::MsgMan messages(options.diag);
-        return command->run(arguments);
+        Tesu::MsgMan messages(DiagLevelOf(options.diag));
+        const int status = command->run();
+        FinishOutput();
+        return status;
     } catch (const UsageError& error) {
-        std::cerr << "tesutil " << command->name << ": " << error.message << "; tesutil "
-                  << command->name << " --help shows the usage\n";
+        PrintUsageError(command->app->get_name(), error.message);
         return kExitUsage;
+    } catch (const WriteError& error) {
+        std::cerr << "tesutil: write error: " << error.reason << std::endl;
+        return kExitFailed;
     } catch (const std::exception& error) {
-        return Fail(command->name, error.what());
+        return Fail(command->app->get_name().c_str(), error.what());
     }
 }
