@@ -113,7 +113,7 @@ void AddNameOptions(Command& command, NameSource& source, const char* operandHel
     source.operands = command.operands;
     source.list = command.app
                       ->add_option("--files-from", source.filesFrom,
-                                   "read the names from LIST, one a line (\"-\": standard input)")
+                                   "read the names from LIST, one a line (\"-\": stdin)")
                       ->type_name("LIST");
     command.least = 0;
     command.most = SIZE_MAX;
@@ -173,20 +173,20 @@ void AddFileCommands(CLI::App& tool, Commands& commands) {
     auto verify = std::make_shared<VerifyOptions>();
     Command& verifyCommand = AddCommand(
         tool, commands, group, "verify", "check checksummed files against their \"# CRC:\" line",
-        "Prints \"<file>: OK\" or \"<file>: FAILED\", one line per file; a file that cannot be\n"
-        "read is reported on standard error (\"tesutil verify: <file>: <reason>\"). A file\n"
-        "without a \"# CRC:\" line is OK unless --strict is given. A name holding a line\n"
-        "break or a backslash is written with \"\\n\" and \"\\\\\" and its line begins with \"\\\".\n"
-        "\"-\" is standard input. Exit status 0 when every file is OK, 1 when any FAILED or\n"
+        "Prints \"<file>: OK\" or \"<file>: FAILED\", one line per file; a file that cannot be "
+        "read is reported on standard error (\"tesutil verify: <file>: <reason>\"). A file "
+        "without a \"# CRC:\" line is OK; with --strict it fails, as \"<file>: FAILED (no "
+        "checksum line)\". --quiet leaves out the OK lines, --status prints nothing at all "
+        "(not even for a file that cannot be read). A name holding a line "
+        "break or a backslash is written with \"\\n\" and \"\\\\\" and its line begins with \"\\\". "
+        "\"-\" is standard input. Exit status 0 when every file is OK, 1 when any FAILED or "
         "cannot be read.");
     AddNameOptions(verifyCommand, verify->names, "the files (\"-\": standard input)");
     verifyCommand.app->add_flag("-q,--quiet", verify->quiet, "print no OK lines");
     verifyCommand.app->add_flag("--status", verify->status,
-                                "print nothing at all, not even for a file that cannot be read: "
-                                "the exit status tells");
+                                "print nothing at all: the exit status tells");
     verifyCommand.app->add_flag("--strict", verify->strict,
-                                "a file without a \"# CRC:\" line fails: \"<file>: FAILED (no "
-                                "checksum line)\"");
+                                "fail a file that has no \"# CRC:\" line");
     verifyCommand.run = [verify] {
         CheckNames(verify->names);
         return ForEachName("verify", verify->names,
@@ -198,11 +198,11 @@ void AddFileCommands(CLI::App& tool, Commands& commands) {
     auto checksum = std::make_shared<NameSource>();
     Command& checksumCommand = AddCommand(
         tool, commands, group, "checksum", "print the checksum text of files' content",
-        "Prints the eight-character checksum text (\"%8x\" of the CRC-32, padded with\n"
-        "blanks) of each file's lines that hold no \"#\", read the way verify reads them.\n"
-        "With exactly one FILE operand the line holds the checksum alone; with several, or\n"
-        "with --files-from, each line is \"<checksum>  <file>\" (a name holding a line break\n"
-        "or a backslash is escaped as verify does, the line then beginning with \"\\\").\n"
+        "Prints the eight-character checksum text (\"%8x\" of the CRC-32, padded with "
+        "blanks) of each file's lines that hold no \"#\", read the way verify reads them. "
+        "With exactly one FILE operand the line holds the checksum alone; with several, or "
+        "with --files-from, each line is \"<checksum>  <file>\" (a name holding a line break "
+        "or a backslash is escaped as verify does, the line then beginning with \"\\\"). "
         "\"-\" is standard input. Exit status 1 when any file cannot be read.");
     AddNameOptions(checksumCommand, *checksum, "the files (\"-\": standard input)");
     checksumCommand.run = [checksum] {
@@ -215,12 +215,12 @@ void AddFileCommands(CLI::App& tool, Commands& commands) {
     auto paths = std::make_shared<bool>(false);
     Command& fileList = AddCommand(
         tool, commands, group, "filelist", "list the members of a file list",
-        "Prints the existing members of the file list LIST, one per line, cleaned (comments,\n"
-        "blanks and doubled separators dropped, separators made the platform's). Missing\n"
+        "Prints the existing members of the file list LIST, one per line, cleaned (comments, "
+        "blanks and doubled separators dropped, separators made the platform's). Missing "
         "members are left out with a warning. Exit status 1 when LIST cannot be read.");
     AddOperand(fileList, "LIST", "the file list", false);
     fileList.app->add_flag("--paths", *paths,
-                           "print each member joined to the list's directory instead");
+                           "print each member joined to the list's directory");
     fileList.least = fileList.most = 1;
     fileList.names = "LIST";
     fileList.run = [paths, operands = fileList.operands] {

@@ -112,39 +112,40 @@ void AddInstallationCommands(CLI::App& tool, Commands& commands) {
     };
 
     add("roots", "show the installation roots in effect",
-        "Prints each installation root, in search order, followed by two blanks and where\n"
-        "it came from in parentheses: --roots, TESSEL_ROOTS, sample installation or\n"
-        "installation prefix; \", missing\" is added for a root that is not an existing\n"
+        "Prints each installation root, in search order, followed by two blanks and where "
+        "it came from in parentheses: --roots, TESSEL_ROOTS, sample installation or "
+        "installation prefix; \", missing\" is added for a root that is not an existing "
         "directory. Exit status 1 when there are no roots.")
         .run = RunRoots;
 
     add("cores-level", "show the level of the last IP core update",
-        "Prints \"Cores Update # <level>\" from the first line holding \"cores_level=\" in\n"
-        "the first readable IPupdate.log among the installation roots. Exit status 1 when\n"
+        "Prints \"Cores Update # <level>\" from the first line holding \"cores_level=\" in "
+        "the first readable IPupdate.log among the installation roots. Exit status 1 when "
         "there is no such log or line.")
         .run = RunCoresLevel;
 
     auto container = std::make_shared<bool>(false);
     Command& find =
         add("find", "find a file or directory under the installation roots",
-            "Prints the absolute path of NAME under the first installation root that holds it.\n"
-            "Exit status 1 when NAME is not found; the message names the roots looked in.");
+            "Prints the absolute path of NAME under the first installation root that holds it. "
+            "With --container it looks inside each entry of the IP container tessel/ip/quarnel "
+            "of each root instead (entries in name order; the first match wins). Exit status 1 "
+            "when NAME is not found; the message names the roots looked in.");
     AddOperand(find, "NAME", "the name, relative to a root", false);
     find.app->add_flag("--container", *container,
-                       "look inside each entry of the IP container tessel/ip/quarnel of each "
-                       "root instead (entries in name order; the first match wins)");
+                       "look in each entry of each root's IP container instead");
     find.least = find.most = 1;
     find.names = "NAME";
     find.run = [container, operands = find.operands] { return RunFind((*operands)[0], *container); };
 
     add("java", "show the Java runtime shipped with the installation",
-        "Prints the absolute path of java/<platform>/jre/bin/java under the first\n"
+        "Prints the absolute path of java/<platform>/jre/bin/java under the first "
         "installation root that holds it. Exit status 1 when there is none.")
         .run = RunJava;
 
-    add("version", "show the application's name, version, build stamp and next major release",
-        "Prints the application name, the version value, the library's build date and\n"
-        "time, and the next major release (tesutil --version prints the tool's own\n"
+    add("version", "show name, version, build stamp, next major release",
+        "Prints the application name, the version value, the library's build date and "
+        "time, and the next major release (tesutil --version prints the tool's own "
         "version).")
         .run = RunVersion;
 
@@ -161,7 +162,7 @@ void AddInstallationCommands(CLI::App& tool, Commands& commands) {
 
     Command& absdir =
         add("absdir", "show the absolute directory a path denotes",
-            "Prints the absolute directory PATH denotes, ending in a separator: PATH itself\n"
+            "Prints the absolute directory PATH denotes, ending in a separator: PATH itself "
             "when it is a directory, else (a file, or a name that does not exist) its parent.");
     AddOperand(absdir, "PATH", "the path", false);
     absdir.least = absdir.most = 1;

@@ -280,20 +280,19 @@ void AddStampCommand(CLI::App& tool, Commands& commands, const char* group) {
     auto options = std::make_shared<StampOptions>();
     Command& stamp = AddCommand(
         tool, commands, group, "stamp", "write or refresh the \"# CRC:\" line of files",
-        "Sets the checksum line of each file to the checksum of its content: the line that\n"
-        "holds the first \"# CRC:\" is refreshed in place; a file without one gets\n"
-        "\"# CRC: <checksum>\" as its first line. Line ends are kept (CR-LF stays CR-LF).\n"
-        "Prints \"<file>: stamped (# CRC: <checksum>)\" or \"<file>: already stamped (...)\".\n"
-        "The new text goes to a temporary file beside the file (same owner, group and\n"
-        "permissions), which is synced, checked and renamed over it; a symbolic link stays\n"
-        "a link to the stamped file. Refused: a file you may not write, a read-only file,\n"
-        "a file with several hard links, a file whose owner cannot be kept; with --force\n"
-        "the last three are stamped (the last two rewritten in place, from a checked\n"
+        "Sets the checksum line of each file to the checksum of its content: the line that "
+        "holds the first \"# CRC:\" is refreshed in place; a file without one gets "
+        "\"# CRC: <checksum>\" as its first line. Line ends are kept (CR-LF stays CR-LF). "
+        "Prints \"<file>: stamped (# CRC: <checksum>)\" or \"<file>: already stamped (...)\". "
+        "The new text goes to a temporary file beside the file (same owner, group and "
+        "permissions), which is synced, checked and renamed over it; a symbolic link stays "
+        "a link to the stamped file. Refused: a file you may not write, a read-only file, "
+        "a file with several hard links, a file whose owner cannot be kept; with --force "
+        "the last three are stamped (the last two rewritten in place, from a checked "
         "temporary copy). Exit status 1 when any file cannot be stamped.");
     AddNameOptions(stamp, options->names, "the files");
     stamp.app->add_flag("-f,--force", options->force,
-                        "stamp read-only files too, and rewrite in place a file with several "
-                        "hard links or whose owner cannot be kept");
+                        "stamp read-only and hard-linked files too (see below)");
     stamp.run = [options] {
         CheckNames(options->names);
         return ForEachName("stamp", options->names, [options](const std::string& name) {

@@ -60,23 +60,39 @@ std::string gRootsOrigin;
 const std::vector<std::string> kDebugLevels = {"off", "normal", "detailed", "verbose"};
 const std::vector<std::string> kDiagLevels = {"silent", "reduced", "standard", "full"};
 
-// A CLI11 check that a value is one of `names`; `what` names the kind in the message.
-CLI::Validator OneOf(const std::string& what, const std::vector<std::string>& names) {
-    return CLI::Validator(
-        [what, names](std::string& value) -> std::string {
-            if (std::find(names.begin(), names.end(), value) != names.end()) {
-                return std::string();
-            }
-            std::string list;
-            for (const std::string& name : names) {
-                list += (list.empty() ? "" : ", ") + name;
-            }
-            return "unknown " + what + " '" + value + "' (" + list + ")";
-        },
-        "");
+// A UsageError unless `value` is one of `names`; `what` names the kind in the message.
+void CheckOneOf(const std::string& what, const std::vector<std::string>& names,
+                const std::string& value) {
+    if (std::find(names.begin(), names.end(), value) != names.end()) {
+        return;
+    }
+    std::string list;
+    for (const std::string& name : names) {
+        list += (list.empty() ? "" : ", ") + name;
+    }
+    throw UsageError{"unknown " + what + " '" + value + "' (" + list + ")"};
+}
+
+// CLI11's message for a bad command line, in the words the tool uses for its own checks.
+std::string UsageText(const CLI::ParseError& error) {
+    const std::string text = error.what();
+    const std::string override = " was given a disallowed flag override";
+    if (text.size() > override.size() &&
+        text.compare(text.size() - override.size(), override.size(), override) == 0) {
+        const std::string name = text.substr(0, text.size() - override.size());
+        return "option " + (name.compare(0, 1, "-") == 0 ? name : "--" + name) +
+               " takes no value";
+    }
+    const std::size_t colon = text.find(": ");
+    if (dynamic_cast<const CLI::ArgumentMismatch*>(&error) != nullptr &&
+        colon != std::string::npos && text.find(" required ", colon) != std::string::npos) {
+        return "option " + text.substr(0, colon) + " needs a value";
+    }
+    return text;
 }
 
 Tesu::MsgMan::DiagnosticLevel DiagLevelOf(const std::string& name) {
+    CheckOneOf("diagnostic level", kDiagLevels, name);
     const auto at = std::find(kDiagLevels.begin(), kDiagLevels.end(), name);
     return static_cast<Tesu::MsgMan::DiagnosticLevel>(at - kDiagLevels.begin());
 }
@@ -253,6 +269,34 @@ void SetInstallationRoots(const CLI::App& tool, const GlobalOptions& options, co
     }
 }
 
+// `text` broken into lines of at most 79 characters at blanks; its own line breaks stay.
+std::string Wrapped(const std::string& text) {
+    constexpr std::size_t kWidth = 79;
+    std::string result;
+    std::size_t lineStart = 0;
+    std::size_t start = 0;
+    while (start <= text.size()) {
+        std::size_t end = text.find_first_of(" \n", start);
+        if (end == std::string::npos) {
+            end = text.size();
+        }
+        const std::string word = text.substr(start, end - start);
+        if (result.size() > lineStart && result.size() - lineStart + 1 + word.size() > kWidth) {
+            result += '\n';
+            lineStart = result.size();
+        } else if (result.size() > lineStart) {
+            result += ' ';
+        }
+        result += word;
+        if (end < text.size() && text[end] == '\n') {
+            result += '\n';
+            lineStart = result.size();
+        }
+        start = end + 1;
+    }
+    return result;
+}
+
 void PrintUsageError(const std::string& command, const std::string& message) {
     const std::string who = command.empty() ? "tesutil" : "tesutil " + command;
     std::cerr << who << ": " << message << "; " << who << " --help shows the usage" << std::endl;
@@ -260,11 +304,8 @@ void PrintUsageError(const std::string& command, const std::string& message) {
 
 }  // namespace
 
-CLI::Validator DebugLevelCheck() {
-    return OneOf("debug level", kDebugLevels);
-}
-
 Tesu::DebugMessenger::DebugLevel DebugLevelOf(const std::string& name) {
+    CheckOneOf("debug level", kDebugLevels, name);
     const auto at = std::find(kDebugLevels.begin(), kDebugLevels.end(), name);
     return static_cast<Tesu::DebugMessenger::DebugLevel>(Tesu::DebugMessenger::DEBUG_OFF +
                                                          (at - kDebugLevels.begin()));
@@ -291,7 +332,7 @@ Command& AddCommand(CLI::App& tool, Commands& commands, const char* group, const
                     const char* summary, const char* description) {
     CLI::App* app = tool.add_subcommand(name, summary);
     app->group(group);
-    app->footer(description);
+    app->footer(Wrapped(description));
     commands.emplace_back();
     commands.back().app = app;
     return commands.back();
@@ -378,34 +419,30 @@ int main(int argc, char** argv) {
 
     CLI::App tool("tesutil: the command-line tool over libTesu_Utilities", "tesutil");
     tool.formatter(std::make_shared<HelpFormatter>());
-    tool.get_formatter()->column_width(28);
+    tool.get_formatter()->column_width(24);
+    // A flag takes no value ("--quiet=yes" is bad usage).
+    tool.option_defaults()->disable_flag_override();
     tool.get_formatter()->label("REQUIRED", "");
     tool.allow_extras();
     tool.require_subcommand(0, 1);
     tool.set_version_flag("--version", kVersionText, "print the tool's version and exit");
     tool.set_help_flag("-h,--help", "print this help and exit");
-    tool.footer(
-        "Global options come before the command; `tesutil <command> --help` shows one command.\n"
+    tool.footer(Wrapped(
+        "Global options come before the command; tesutil <command> --help shows one command. "
         "Long options may be shortened to any unique beginning.\n"
-        "Roots: --roots when given, else TESSEL_ROOTS when it is set (even to nothing), else\n"
-        "the sample installation " TESUTIL_SAMPLE_FROM_EXE
-        " (relative to the directory of\n"
-        "the tesutil executable), else the installation prefix; `tesutil roots` shows them.\n"
-        "Exit status: 0 success, 1 a check failed, a thing was not found or output failed,\n"
-        "2 bad usage.");
+        "Installation roots: --roots when given, else TESSEL_ROOTS when it is set (even to "
+        "nothing), else the sample installation " TESUTIL_SAMPLE_FROM_EXE
+        " (relative to the directory of the tesutil executable) when it is there, else the "
+        "installation prefix; tesutil roots shows them.\n"
+        "Exit status: 0 success, 1 a check failed, a thing was not found or output failed, "
+        "2 bad usage."));
     GlobalOptions options;
-    tool.add_option("--roots", options.roots,
-                    "installation roots, in search order (\";\" between them on Windows)")
+    tool.add_option("--roots", options.roots, "installation roots in search order (\";\" on Windows)")
         ->type_name("DIR[:DIR...]");
-    tool.add_option("--debug", options.debug,
-                    "root logger level: off (default), normal, detailed, verbose")
-        ->type_name("LEVEL")
-        ->check(DebugLevelCheck());
-    tool.add_option("--diag", options.diag,
-                    "library messages on standard error: silent, reduced, standard (default), "
-                    "full")
-        ->type_name("LEVEL")
-        ->check(OneOf("diagnostic level", kDiagLevels));
+    tool.add_option("--debug", options.debug, "root logger: off (default), normal, detailed, verbose")
+        ->type_name("LEVEL");
+    tool.add_option("--diag", options.diag, "messages shown: silent, reduced, standard, full")
+        ->type_name("LEVEL");
 
     Commands commands;
     AddFileCommands(tool, commands);
@@ -484,7 +521,18 @@ int main(int argc, char** argv) {
         PrintUsageError(named != nullptr ? named->get_name() : "", error.message);
         return kExitUsage;
     } catch (const CLI::ParseError& error) {
-        PrintUsageError(named != nullptr ? named->get_name() : "", error.what());
+        PrintUsageError(named != nullptr ? named->get_name() : "", UsageText(error));
+        return kExitUsage;
+    }
+    try {
+        // The levels are checked here, after the parse, so that a bad one is reported as a fault
+        // of the global option rather than of the command that follows it.
+        if (tool.count("--debug") > 0) {
+            DebugLevelOf(options.debug);
+        }
+        DiagLevelOf(options.diag);
+    } catch (const UsageError& error) {
+        PrintUsageError("", error.message);
         return kExitUsage;
     }
 

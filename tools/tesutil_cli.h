@@ -62,9 +62,8 @@ Command& AddCommand(CLI::App& tool, Commands& commands, const char* group, const
 // the command's operands, in the order given.
 void AddOperand(Command& command, const char* name, const char* help, bool many);
 
-// A CLI11 check that a debug level is one of "off", "normal", "detailed", "verbose", and the
-// level a checked name stands for.
-CLI::Validator DebugLevelCheck();
+// The debug level "off", "normal", "detailed" or "verbose" stands for; any other name is a
+// UsageError.
 Tesu::DebugMessenger::DebugLevel DebugLevelOf(const std::string& name);
 // True when the global option --debug was given.
 bool GlobalDebugLevelGiven();

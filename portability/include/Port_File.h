@@ -55,12 +55,37 @@ class PORT_API Stream {
     // reading just as the end of the file does; this tells the two apart.
     StringBase<char> error() const;
 
+    // Writes buffered bytes out and has the system write the file's data to the device
+    // (fsync; FlushFileBuffers on Windows), so that it outlasts a power loss. False on failure
+    // or on a stream opened for reading; File::lastError() then says why.
+    bool sync();
+    // Sets the permission bits of the open file (07777 on POSIX). On Windows a value without any
+    // write bit sets the read-only attribute and any other clears it. False on failure, with
+    // File::lastError().
+    bool setPermissions(std::uint32_t permissions);
+    // Gives the open file the owner and group ids `owner` and `group` (-1 keeps one as it is).
+    // POSIX only lets a process that is not privileged set its own user and a group it belongs
+    // to: otherwise false, with File::lastError() ("Operation not permitted"). On Windows, whose
+    // files have access lists rather than ids, it changes nothing and answers true.
+    bool setOwner(std::int64_t owner, std::int64_t group);
+
   private:
     friend class File;
     struct Impl;
     explicit Stream(std::unique_ptr<Impl> impl);
     ~Stream();
     std::unique_ptr<Impl> impl_;
+};
+
+// What File::status tells about a name, symbolic links followed.
+struct FileStatus {
+    bool regular = false;           // a regular file
+    bool directory = false;         // a directory
+    std::uint64_t links = 0;        // the file's number of names (hard links)
+    std::uint32_t permissions = 0;  // permission bits (07777); on Windows 0444 for a read-only
+                                    // file, else 0666
+    std::int64_t owner = -1;        // user and group ids; -1 on Windows, which has none
+    std::int64_t group = -1;
 };
 
 // Static file services.
@@ -90,8 +115,35 @@ class PORT_API File {
     // Writes out and closes the stream, and frees it in every case. Returns false when
     // writing out or closing failed, or when `stream` is null.
     static bool close(Stream* stream);
-    // Why the last failed open, openStandardInput or close of the calling thread failed, in the
-    // system's words: "No such file or directory", "Permission denied", "Is a directory",
+    // Creates a new, empty file beside `target` (in the same directory, so that rename can put
+    // it in the target's place) and returns a stream writing it, binary, that the caller
+    // releases with close; `name` receives its name: "." followed by the target's final part,
+    // ".", the process id, "-", a counter and ".tmp". The create is exclusive (O_CREAT|O_EXCL,
+    // never through a link; CREATE_NEW on Windows) and the file readable and writable by its
+    // owner only (0600); a name already taken is passed over for the next counter, up to 1000
+    // tries. Null on failure, with lastError() ("Permission denied" for a directory this
+    // process may not write); the caller removes the file when it is done with it.
+    static Stream* createTemporary(const StringBase<char>& target, StringBase<char>& name);
+    // Fills `status` for `name` (symbolic links followed) and returns true; false, with
+    // lastError(), when it does not exist or cannot be examined.
+    static bool status(const StringBase<char>& name, FileStatus& status);
+    // True when this process may write `name` (access W_OK on POSIX, which is true for root even
+    // on a file without write bits; on Windows the file opens for writing). False with
+    // lastError() otherwise.
+    static bool canwrite(const StringBase<char>& name);
+    // Renames `from` to `to`, replacing a file named `to` in one step, so that another process
+    // sees the old file or the new one, never neither (rename; MoveFileExW with
+    // MOVEFILE_REPLACE_EXISTING | MOVEFILE_WRITE_THROUGH on Windows). Both must be on one file
+    // system. False with lastError() on failure, both names then as they were.
+    static bool rename(const StringBase<char>& from, const StringBase<char>& to);
+    // Removes the file `name` (not a directory). False with lastError() on failure.
+    static bool remove(const StringBase<char>& name);
+    // Has the system write the entries of `directory` (the empty text: the working directory)
+    // to the device, so that a rename into it outlasts a power loss (fsync of the directory).
+    // On Windows true without a call: rename writes through. False with lastError() on failure.
+    static bool syncDirectory(const StringBase<char>& directory);
+    // Why the last failed open, openStandardInput, close (or one of the operations above, or
+    // Stream::sync, setPermissions, setOwner) of the calling thread failed, in the system's words: "No such file or directory", "Permission denied", "Is a directory",
     // "Not a regular file" (a FIFO or a device opened for reading), "Invalid argument" (an
     // unknown access value, a name holding a NUL byte or, on Windows, invalid UTF-8). The text
     // stays until the next failure of the thread; successful calls leave it as it is.

@@ -238,6 +238,31 @@ StringBase<char> Stream::error() const {
     return impl_->reason;
 }
 
+bool Stream::sync() {
+    Impl& s = *impl_;
+    if (!s.writable) {
+        return failWith(systemReason(EBADF), false);
+    }
+    if (!s.writeOut()) {
+        return failWith(s.reason, false);
+    }
+    if (!os::syncFile(s.handle)) {
+        const int code = errno;
+        s.fail(code);
+        return failWith(systemReason(code), false);
+    }
+    return true;
+}
+
+bool Stream::setPermissions(std::uint32_t permissions) {
+    return os::setHandlePermissions(impl_->handle, permissions) ||
+           failWith(systemReason(errno), false);
+}
+
+bool Stream::setOwner(std::int64_t owner, std::int64_t group) {
+    return os::setHandleOwner(impl_->handle, owner, group) || failWith(systemReason(errno), false);
+}
+
 Stream* File::open(const StringBase<char>& name, int access, bool binary) {
     os::OpenMode mode;
     switch (access) {
@@ -302,6 +327,84 @@ Stream* File::openStandardInput() {
     std::unique_ptr<Stream::Impl> impl(
         new Stream::Impl(handle, StringBase<char>("-"), false, kReadBufferSize));
     return new Stream(std::move(impl));
+}
+
+Stream* File::createTemporary(const StringBase<char>& target, StringBase<char>& name) {
+    std::string native;
+    if (!systemName(target, native) || native.empty()) {
+        return failWith<Stream*>(systemReason(EINVAL), nullptr);
+    }
+    const std::size_t cut = native.find_last_of(os::kPathSeparator);
+    const std::string directory = cut == std::string::npos ? std::string() : native.substr(0, cut + 1);
+    const std::string base = cut == std::string::npos ? native : native.substr(cut + 1);
+    const std::string stem =
+        directory + "." + base + "." + std::to_string(os::processId()) + "-";
+    for (int counter = 0; counter < 1000; ++counter) {
+        const std::string candidate = stem + std::to_string(counter) + ".tmp";
+        const os::Handle handle = os::createNewFile(candidate);
+        if (handle != os::INVALID_HANDLE) {
+            name.Assign(candidate.data(), candidate.size());
+            std::unique_ptr<Stream::Impl> impl(
+                new Stream::Impl(handle, name, true, kWriteBufferSize));
+            return new Stream(std::move(impl));
+        }
+        if (errno != EEXIST) {
+            break;
+        }
+    }
+    return failWith<Stream*>(systemReason(errno), nullptr);
+}
+
+bool File::status(const StringBase<char>& name, FileStatus& status) {
+    std::string native;
+    if (!systemName(name, native) || native.empty()) {
+        return failWith(systemReason(native.empty() ? ENOENT : EINVAL), false);
+    }
+    os::NameInfo info;
+    if (!os::nameInfo(native, info)) {
+        return failWith(systemReason(errno), false);
+    }
+    status.regular = info.kind == os::Kind::FILE;
+    status.directory = info.kind == os::Kind::DIRECTORY;
+    status.links = info.links;
+    status.permissions = info.permissions;
+    status.owner = info.owner;
+    status.group = info.group;
+    return true;
+}
+
+bool File::canwrite(const StringBase<char>& name) {
+    std::string native;
+    if (!systemName(name, native) || native.empty()) {
+        return failWith(systemReason(EINVAL), false);
+    }
+    return os::canWrite(native) || failWith(systemReason(errno), false);
+}
+
+bool File::rename(const StringBase<char>& from, const StringBase<char>& to) {
+    std::string nativeFrom;
+    std::string nativeTo;
+    if (!systemName(from, nativeFrom) || !systemName(to, nativeTo) || nativeFrom.empty() ||
+        nativeTo.empty()) {
+        return failWith(systemReason(EINVAL), false);
+    }
+    return os::renameFile(nativeFrom, nativeTo) || failWith(systemReason(errno), false);
+}
+
+bool File::remove(const StringBase<char>& name) {
+    std::string native;
+    if (!systemName(name, native) || native.empty()) {
+        return failWith(systemReason(EINVAL), false);
+    }
+    return os::removeFile(native) || failWith(systemReason(errno), false);
+}
+
+bool File::syncDirectory(const StringBase<char>& directory) {
+    std::string native;
+    if (!systemName(directory, native)) {
+        return failWith(systemReason(EINVAL), false);
+    }
+    return os::syncDirectory(native) || failWith(systemReason(errno), false);
 }
 
 StringBase<char> File::lastError() {

@@ -124,6 +124,76 @@ std::int64_t handleSize(Handle handle) {
     return static_cast<std::int64_t>(info.st_size);
 }
 
+Handle createNewFile(const std::string& name) {
+    int result;
+    do {
+        result = ::open(name.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC | O_NOFOLLOW, 0600);
+    } while (result < 0 && errno == EINTR);
+    return result < 0 ? INVALID_HANDLE : static_cast<Handle>(result);
+}
+
+bool syncFile(Handle handle) {
+    int result;
+    do {
+        result = ::fsync(fd(handle));
+    } while (result != 0 && errno == EINTR);
+    return result == 0;
+}
+
+bool setHandlePermissions(Handle handle, std::uint32_t permissions) {
+    return ::fchmod(fd(handle), static_cast<mode_t>(permissions & 07777)) == 0;
+}
+
+bool setHandleOwner(Handle handle, std::int64_t owner, std::int64_t group) {
+    if (owner < 0 && group < 0) {
+        return true;
+    }
+    return ::fchown(fd(handle), owner < 0 ? static_cast<uid_t>(-1) : static_cast<uid_t>(owner),
+                    group < 0 ? static_cast<gid_t>(-1) : static_cast<gid_t>(group)) == 0;
+}
+
+bool nameInfo(const std::string& name, NameInfo& result) {
+    struct stat info;
+    if (::stat(name.c_str(), &info) != 0) {
+        return false;
+    }
+    result.kind = kindOf(info);
+    result.links = static_cast<std::uint64_t>(info.st_nlink);
+    result.permissions = static_cast<std::uint32_t>(info.st_mode & 07777);
+    result.owner = static_cast<std::int64_t>(info.st_uid);
+    result.group = static_cast<std::int64_t>(info.st_gid);
+    return true;
+}
+
+bool canWrite(const std::string& name) {
+    return ::access(name.c_str(), W_OK) == 0;
+}
+
+bool renameFile(const std::string& from, const std::string& to) {
+    return ::rename(from.c_str(), to.c_str()) == 0;
+}
+
+bool removeFile(const std::string& name) {
+    return ::unlink(name.c_str()) == 0;
+}
+
+bool syncDirectory(const std::string& directory) {
+    const int handle = ::open(directory.empty() ? "." : directory.c_str(),
+                              O_RDONLY | O_DIRECTORY | O_CLOEXEC);
+    if (handle < 0) {
+        return false;
+    }
+    const bool synced = syncFile(static_cast<Handle>(handle));
+    const int code = errno;
+    ::close(handle);
+    errno = code;
+    return synced;
+}
+
+std::uint64_t processId() {
+    return static_cast<std::uint64_t>(::getpid());
+}
+
 Kind nameKind(const std::string& name) {
     struct stat info;
     if (::stat(name.c_str(), &info) != 0) {

@@ -109,6 +109,37 @@ bool isDotOrDotDot(const wchar_t* name) {
     return std::wcscmp(name, L".") == 0 || std::wcscmp(name, L"..") == 0;
 }
 
+// The errno value closest to a system error code, so that the layer's reasons read alike on
+// every platform.
+int systemErrno(DWORD code) {
+    switch (code) {
+        case ERROR_FILE_NOT_FOUND:
+        case ERROR_PATH_NOT_FOUND:
+        case ERROR_INVALID_DRIVE:
+        case ERROR_BAD_NETPATH:
+            return ENOENT;
+        case ERROR_ACCESS_DENIED:
+        case ERROR_SHARING_VIOLATION:
+        case ERROR_LOCK_VIOLATION:
+            return EACCES;
+        case ERROR_FILE_EXISTS:
+        case ERROR_ALREADY_EXISTS:
+            return EEXIST;
+        case ERROR_DISK_FULL:
+        case ERROR_HANDLE_DISK_FULL:
+            return ENOSPC;
+        case ERROR_WRITE_PROTECT:
+            return EROFS;
+        case ERROR_NOT_SAME_DEVICE:
+            return EXDEV;
+        case ERROR_INVALID_NAME:
+        case ERROR_INVALID_PARAMETER:
+            return EINVAL;
+        default:
+            return EIO;
+    }
+}
+
 // An address inside libPortability, to find the module that holds it.
 const char anchor = 0;
 
@@ -199,6 +230,138 @@ std::int64_t handleSize(Handle handle) {
     }
     const __int64 size = ::_filelengthi64(fd(handle));
     return size < 0 ? -1 : static_cast<std::int64_t>(size);
+}
+
+Handle createNewFile(const std::string& name) {
+    std::wstring wide;
+    if (!widen(name, wide) || wide.empty()) {
+        errno = EINVAL;
+        return INVALID_HANDLE;
+    }
+    // _O_CREAT with _O_EXCL is CreateFileW's CREATE_NEW: it fails when the name is taken.
+    // The file may be read, written and deleted by others meanwhile, as every file the layer
+    // opens.
+    int result = -1;
+    if (::_wsopen_s(&result, wide.c_str(),
+                    _O_WRONLY | _O_CREAT | _O_EXCL | _O_BINARY | _O_NOINHERIT, _SH_DENYNO,
+                    _S_IREAD | _S_IWRITE) != 0) {
+        return INVALID_HANDLE;
+    }
+    return static_cast<Handle>(result);
+}
+
+bool syncFile(Handle handle) {
+    const intptr_t os = ::_get_osfhandle(fd(handle));
+    if (os == -1 || !::FlushFileBuffers(reinterpret_cast<HANDLE>(os))) {
+        errno = systemErrno(::GetLastError());
+        return false;
+    }
+    return true;
+}
+
+bool setHandlePermissions(Handle handle, std::uint32_t permissions) {
+    const intptr_t os = ::_get_osfhandle(fd(handle));
+    FILE_BASIC_INFO info;
+    if (os == -1 || !::GetFileInformationByHandleEx(reinterpret_cast<HANDLE>(os), FileBasicInfo,
+                                                    &info, sizeof info)) {
+        errno = systemErrno(::GetLastError());
+        return false;
+    }
+    if ((permissions & 0222) == 0) {
+        info.FileAttributes |= FILE_ATTRIBUTE_READONLY;
+    } else {
+        info.FileAttributes &= ~static_cast<DWORD>(FILE_ATTRIBUTE_READONLY);
+    }
+    if (info.FileAttributes == 0) {
+        info.FileAttributes = FILE_ATTRIBUTE_NORMAL;
+    }
+    if (!::SetFileInformationByHandle(reinterpret_cast<HANDLE>(os), FileBasicInfo, &info,
+                                      sizeof info)) {
+        errno = systemErrno(::GetLastError());
+        return false;
+    }
+    return true;
+}
+
+bool setHandleOwner(Handle /*handle*/, std::int64_t /*owner*/, std::int64_t /*group*/) {
+    // Windows files have access lists, not owner and group ids: a new file takes the lists its
+    // directory passes on.
+    return true;
+}
+
+bool nameInfo(const std::string& name, NameInfo& result) {
+    std::wstring wide;
+    if (!widen(name, wide) || wide.empty()) {
+        errno = EINVAL;
+        return false;
+    }
+    const HANDLE handle = openForQuery(wide, 0);
+    if (handle == INVALID_HANDLE_VALUE) {
+        errno = systemErrno(::GetLastError());
+        return false;
+    }
+    result = NameInfo();
+    result.kind = kindOfHandle(handle);
+    BY_HANDLE_FILE_INFORMATION info;
+    if (result.kind != Kind::OTHER && ::GetFileInformationByHandle(handle, &info)) {
+        result.links = info.nNumberOfLinks;
+        result.permissions = (info.dwFileAttributes & FILE_ATTRIBUTE_READONLY) != 0 ? 0444 : 0666;
+    }
+    ::CloseHandle(handle);
+    return true;
+}
+
+bool canWrite(const std::string& name) {
+    std::wstring wide;
+    if (!widen(name, wide) || wide.empty()) {
+        errno = EINVAL;
+        return false;
+    }
+    // Windows decides by its access lists and the read-only attribute: the test is the act.
+    const HANDLE handle = openForQuery(wide, GENERIC_WRITE);
+    if (handle == INVALID_HANDLE_VALUE) {
+        errno = systemErrno(::GetLastError());
+        return false;
+    }
+    ::CloseHandle(handle);
+    return true;
+}
+
+bool renameFile(const std::string& from, const std::string& to) {
+    std::wstring wideFrom;
+    std::wstring wideTo;
+    if (!widen(from, wideFrom) || !widen(to, wideTo) || wideFrom.empty() || wideTo.empty()) {
+        errno = EINVAL;
+        return false;
+    }
+    if (!::MoveFileExW(wideFrom.c_str(), wideTo.c_str(),
+                       MOVEFILE_REPLACE_EXISTING | MOVEFILE_WRITE_THROUGH)) {
+        errno = systemErrno(::GetLastError());
+        return false;
+    }
+    return true;
+}
+
+bool removeFile(const std::string& name) {
+    std::wstring wide;
+    if (!widen(name, wide) || wide.empty()) {
+        errno = EINVAL;
+        return false;
+    }
+    if (!::DeleteFileW(wide.c_str())) {
+        errno = systemErrno(::GetLastError());
+        return false;
+    }
+    return true;
+}
+
+bool syncDirectory(const std::string& /*directory*/) {
+    // renameFile writes the move through before it returns.
+    return true;
+}
+
+std::uint64_t processId() {
+    return static_cast<std::uint64_t>(::GetCurrentProcessId());
 }
 
 Kind nameKind(const std::string& name) {

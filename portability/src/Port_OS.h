@@ -58,6 +58,43 @@ Kind handleKind(Handle handle);
 // The size of an open regular file, or -1 when it is not known.
 std::int64_t handleSize(Handle handle);
 
+// Creates `name` as a new file for writing, only when nothing of that name exists (never
+// through a link), readable and writable by its owner alone (0600 on POSIX), binary, not
+// inherited. INVALID_HANDLE on failure; errno EEXIST when the name is taken.
+Handle createNewFile(const std::string& name);
+// Writes the file's data out to the device (fsync, FlushFileBuffers).
+bool syncFile(Handle handle);
+// Sets the permission bits of an open file (07777 on POSIX; on Windows a value without any
+// write bit makes the file read-only, any other clears that attribute).
+bool setHandlePermissions(Handle handle, std::uint32_t permissions);
+// Gives an open file the owner and group ids (fchown); true without a change for -1, and
+// always on Windows, where files have no such ids.
+bool setHandleOwner(Handle handle, std::int64_t owner, std::int64_t group);
+
+// What `name` denotes and how (symbolic links followed).
+struct NameInfo {
+    Kind kind = Kind::NONE;
+    std::uint64_t links = 0;
+    std::uint32_t permissions = 0;
+    std::int64_t owner = -1;
+    std::int64_t group = -1;
+};
+// False (errno set) when `name` does not exist or cannot be examined.
+bool nameInfo(const std::string& name, NameInfo& info);
+// True when this process may write `name` (access W_OK; on Windows the file opens for
+// writing). errno says why not.
+bool canWrite(const std::string& name);
+// Renames `from` to `to`, replacing a file `to` in one step (rename, MoveFileExW with
+// MOVEFILE_REPLACE_EXISTING and MOVEFILE_WRITE_THROUGH).
+bool renameFile(const std::string& from, const std::string& to);
+// Removes the file `name`.
+bool removeFile(const std::string& name);
+// Writes the directory's entries out to the device (fsync of the directory on POSIX; true on
+// Windows, where renameFile's write-through makes the new entry lasting).
+bool syncDirectory(const std::string& directory);
+// The process's id, for names of temporary files.
+std::uint64_t processId();
+
 // What `name` denotes (symbolic links followed); NONE when it does not exist or cannot be
 // examined.
 Kind nameKind(const std::string& name);
