@@ -9,6 +9,7 @@
 #include <cerrno>
 #include <cstring>
 #include <filesystem>
+#include <functional>
 #include <random>
 #include <stdexcept>
 #include <string>
@@ -430,6 +431,73 @@ TEST(PortFile, CanreadFollowsPermissions) {
     EXPECT_FALSE(File::canread(dir.c_str()));
     UT_DIR listing(dir.c_str(), UT_DIR::ALL);
     EXPECT_FALSE(listing.isOpen());
+}
+
+// What a replacement of a file by a new version needs: an exclusive temporary file beside it,
+// the file's status, sync, permissions, owner, rename over it, removal, and the directory sync.
+TEST(PortFile, ReplacingAFileThroughATemporaryOne) {
+    tesutest::TempDir tmp;
+    const std::string target = tmp.write("data.cfg", "old\n");
+    Port::StringBase<char> first;
+    Stream* out = File::createTemporary(target, first);
+    ASSERT_NE(out, nullptr) << File::lastError().str();
+    // Beside the target, hidden, and a second one made meanwhile gets a name of its own.
+    EXPECT_EQ(fs::path(first.str()).parent_path(), fs::path(target).parent_path());
+    EXPECT_EQ(fs::path(first.str()).filename().string().rfind(".data.cfg.", 0), 0u) << first.str();
+    Port::StringBase<char> second;
+    Stream* other = File::createTemporary(target, second);
+    ASSERT_NE(other, nullptr);
+    EXPECT_NE(first.str(), second.str());
+    EXPECT_TRUE(File::close(other));
+    EXPECT_TRUE(File::remove(second));
+    EXPECT_FALSE(File::exist(second));
+    EXPECT_FALSE(File::remove(second));
+    EXPECT_EQ(File::lastError().str(), std::strerror(ENOENT));
+
+    Port::FileStatus status;
+    ASSERT_TRUE(File::status(first, status));
+    EXPECT_TRUE(status.regular);
+    EXPECT_EQ(status.links, 1u);
+#ifndef _WIN32
+    EXPECT_EQ(status.permissions, 0600u);  // the owner's alone until the caller says otherwise
+    EXPECT_TRUE(out->setPermissions(0640));
+    EXPECT_TRUE(out->setOwner(status.owner, status.group));
+    ASSERT_TRUE(File::status(first, status));
+    EXPECT_EQ(status.permissions, 0640u);
+    ASSERT_EQ(::link(target.c_str(), tmp.join("second-name").c_str()), 0);
+    Port::FileStatus linked;
+    ASSERT_TRUE(File::status(target, linked));
+    EXPECT_EQ(linked.links, 2u);
+    EXPECT_FALSE(linked.directory);
+#endif
+    EXPECT_TRUE(out->write("new\n", 4));
+    EXPECT_TRUE(out->sync());
+    EXPECT_TRUE(File::close(out));
+    EXPECT_TRUE(File::rename(first, target));
+    EXPECT_FALSE(File::exist(first));
+    EXPECT_EQ(readLines(target), std::vector<std::string>{"new"});
+    EXPECT_TRUE(File::syncDirectory(tmp.path()));
+    EXPECT_TRUE(File::canwrite(target));
+
+    // Failures answer false and say why in the system's words.
+    const std::string missing = tmp.join("none/x");
+    Port::StringBase<char> unused;
+    const std::function<bool()> failures[] = {
+        [&] { return File::createTemporary(missing, unused) != nullptr; },
+        [&] { return File::status(missing, status); },
+        [&] { return File::canwrite(missing); },
+        [&] { return File::rename(missing, target); },
+#ifndef _WIN32  // Windows writes a rename through instead of syncing the directory
+        [&] { return File::syncDirectory(tmp.join("none")); },
+#endif
+    };
+    for (const auto& failure : failures) {
+        EXPECT_FALSE(failure());
+        EXPECT_EQ(File::lastError().str(), std::strerror(ENOENT));
+    }
+    ASSERT_TRUE(File::status(tmp.path(), status));
+    EXPECT_TRUE(status.directory);
+    EXPECT_FALSE(status.regular);
 }
 
 TEST(PortFile, WorkingDirectory) {

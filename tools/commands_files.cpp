@@ -154,8 +154,9 @@ int ForEachName(const char* command, const NameSource& source,
         }
         if (fromInput && line.str() == "-") {
             allOk = false;
-            Fail(command, "when reading file names from standard input, no file name of '-' "
-                          "allowed");
+            Fail(command,
+                 "when reading file names from standard input, no file name of '-' "
+                 "allowed");
             continue;
         }
         allOk = each(line.str()) && allOk;
@@ -178,7 +179,8 @@ void AddFileCommands(CLI::App& tool, Commands& commands) {
         "without a \"# CRC:\" line is OK; with --strict it fails, as \"<file>: FAILED (no "
         "checksum line)\". --quiet leaves out the OK lines, --status prints nothing at all "
         "(not even for a file that cannot be read). A name holding a line "
-        "break or a backslash is written with \"\\n\" and \"\\\\\" and its line begins with \"\\\". "
+        "break or a backslash is written with \"\\n\" and \"\\\\\" and its line begins with "
+        "\"\\\". "
         "\"-\" is standard input. Exit status 0 when every file is OK, 1 when any FAILED or "
         "cannot be read.");
     AddNameOptions(verifyCommand, verify->names, "the files (\"-\": standard input)");
@@ -219,8 +221,7 @@ void AddFileCommands(CLI::App& tool, Commands& commands) {
         "blanks and doubled separators dropped, separators made the platform's). Missing "
         "members are left out with a warning. Exit status 1 when LIST cannot be read.");
     AddOperand(fileList, "LIST", "the file list", false);
-    fileList.app->add_flag("--paths", *paths,
-                           "print each member joined to the list's directory");
+    fileList.app->add_flag("--paths", *paths, "print each member joined to the list's directory");
     fileList.least = fileList.most = 1;
     fileList.names = "LIST";
     fileList.run = [paths, operands = fileList.operands] {

@@ -136,7 +136,9 @@ void AddInstallationCommands(CLI::App& tool, Commands& commands) {
                        "look in each entry of each root's IP container instead");
     find.least = find.most = 1;
     find.names = "NAME";
-    find.run = [container, operands = find.operands] { return RunFind((*operands)[0], *container); };
+    find.run = [container, operands = find.operands] {
+        return RunFind((*operands)[0], *container);
+    };
 
     add("java", "show the Java runtime shipped with the installation",
         "Prints the absolute path of java/<platform>/jre/bin/java under the first "

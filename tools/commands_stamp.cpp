@@ -111,7 +111,8 @@ void CopyStamped(const Port::StringBase<char>& target, const Tesu::ChecksumScan&
         skipFrom = scan.markerOffset + kMarkerLength;
         skipTo = skipFrom + scan.markerField.GetLength();
     } else {
-        const std::string line = kMarker + field + (scan.firstLineBreak.str() == "\r\n" ? "\r\n" : "\n");
+        const std::string line =
+            kMarker + field + (scan.firstLineBreak.str() == "\r\n" ? "\r\n" : "\n");
         Write(out, line.data(), line.size());
     }
     const OpenStream in(Port::File::open(target, Port::File::READ, true));

@@ -43,10 +43,9 @@ namespace {
 
 namespace fs = std::filesystem;
 
-const char kVersionText[] =
-    "tesutil " TESUTIL_VERSION
-    "\n"
-    "There is NO WARRANTY, to the extent permitted by law.";
+const char kVersionText[] = "tesutil " TESUTIL_VERSION
+                            "\n"
+                            "There is NO WARRANTY, to the extent permitted by law.";
 
 struct GlobalOptions {
     std::string roots;
@@ -80,8 +79,7 @@ std::string UsageText(const CLI::ParseError& error) {
     if (text.size() > override.size() &&
         text.compare(text.size() - override.size(), override.size(), override) == 0) {
         const std::string name = text.substr(0, text.size() - override.size());
-        return "option " + (name.compare(0, 1, "-") == 0 ? name : "--" + name) +
-               " takes no value";
+        return "option " + (name.compare(0, 1, "-") == 0 ? name : "--" + name) + " takes no value";
     }
     const std::size_t colon = text.find(": ");
     if (dynamic_cast<const CLI::ArgumentMismatch*>(&error) != nullptr &&
@@ -174,7 +172,7 @@ std::vector<std::string> Prepare(const CLI::App& tool, const std::vector<std::st
             const std::size_t equals = argument.find('=');
             std::string name = argument.substr(0, equals);
             const CLI::Option* option = FindLongOption(*current, name);
-            const bool takesValue = option != nullptr && option->get_type_size() > 0;
+            const bool takesValue = option != nullptr && option->get_items_expected_min() > 0;
             prepared.push_back(equals == std::string::npos ? name : name + argument.substr(equals));
             if (takesValue && equals == std::string::npos && index + 1 < all.size()) {
                 prepared.push_back(all[++index]);
@@ -355,8 +353,7 @@ void AddOperand(Command& command, const char* name, const char* help, bool many)
     } else {
         command.app
             ->add_option_function<std::string>(
-                name, [operands](const std::string& value) { operands->push_back(value); },
-                help)
+                name, [operands](const std::string& value) { operands->push_back(value); }, help)
             ->type_name("");
     }
 }
@@ -437,9 +434,11 @@ int main(int argc, char** argv) {
         "Exit status: 0 success, 1 a check failed, a thing was not found or output failed, "
         "2 bad usage."));
     GlobalOptions options;
-    tool.add_option("--roots", options.roots, "installation roots in search order (\";\" on Windows)")
+    tool.add_option("--roots", options.roots,
+                    "installation roots in search order (\";\" on Windows)")
         ->type_name("DIR[:DIR...]");
-    tool.add_option("--debug", options.debug, "root logger: off (default), normal, detailed, verbose")
+    tool.add_option("--debug", options.debug,
+                    "root logger: off (default), normal, detailed, verbose")
         ->type_name("LEVEL");
     tool.add_option("--diag", options.diag, "messages shown: silent, reduced, standard, full")
         ->type_name("LEVEL");

@@ -35,7 +35,8 @@ struct WriteError {
 
 // One command: its CLI11 subcommand (options bound to the command's own variables), the
 // vector that receives its operands (made by AddOperand; null for a command without operands;
-// the operands after "--" are appended there too), how many it takes and what they are called in messages
+// the operands after "--" are appended there too), how many it takes and what they are called in
+// messages
 // ("FILE...", "BASE PATH"), and the function that runs it once the line is parsed.
 struct Command {
     CLI::App* app = nullptr;

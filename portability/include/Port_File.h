@@ -143,10 +143,11 @@ class PORT_API File {
     // On Windows true without a call: rename writes through. False with lastError() on failure.
     static bool syncDirectory(const StringBase<char>& directory);
     // Why the last failed open, openStandardInput, close (or one of the operations above, or
-    // Stream::sync, setPermissions, setOwner) of the calling thread failed, in the system's words: "No such file or directory", "Permission denied", "Is a directory",
-    // "Not a regular file" (a FIFO or a device opened for reading), "Invalid argument" (an
-    // unknown access value, a name holding a NUL byte or, on Windows, invalid UTF-8). The text
-    // stays until the next failure of the thread; successful calls leave it as it is.
+    // Stream::sync, setPermissions, setOwner) of the calling thread failed, in the system's words:
+    // "No such file or directory", "Permission denied", "Is a directory", "Not a regular file" (a
+    // FIFO or a device opened for reading), "Invalid argument" (an unknown access value, a name
+    // holding a NUL byte or, on Windows, invalid UTF-8). The text stays until the next failure of
+    // the thread; successful calls leave it as it is.
     static StringBase<char> lastError();
 
     // True for an existing file or directory (symbolic links followed).

@@ -335,10 +335,10 @@ Stream* File::createTemporary(const StringBase<char>& target, StringBase<char>& 
         return failWith<Stream*>(systemReason(EINVAL), nullptr);
     }
     const std::size_t cut = native.find_last_of(os::kPathSeparator);
-    const std::string directory = cut == std::string::npos ? std::string() : native.substr(0, cut + 1);
+    const std::string directory =
+        cut == std::string::npos ? std::string() : native.substr(0, cut + 1);
     const std::string base = cut == std::string::npos ? native : native.substr(cut + 1);
-    const std::string stem =
-        directory + "." + base + "." + std::to_string(os::processId()) + "-";
+    const std::string stem = directory + "." + base + "." + std::to_string(os::processId()) + "-";
     for (int counter = 0; counter < 1000; ++counter) {
         const std::string candidate = stem + std::to_string(counter) + ".tmp";
         const os::Handle handle = os::createNewFile(candidate);

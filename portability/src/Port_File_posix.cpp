@@ -178,8 +178,8 @@ bool removeFile(const std::string& name) {
 }
 
 bool syncDirectory(const std::string& directory) {
-    const int handle = ::open(directory.empty() ? "." : directory.c_str(),
-                              O_RDONLY | O_DIRECTORY | O_CLOEXEC);
+    const int handle =
+        ::open(directory.empty() ? "." : directory.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC);
     if (handle < 0) {
         return false;
     }

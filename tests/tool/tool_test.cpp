@@ -1,9 +1,15 @@
 // tesutil run as a process: standard output, standard error and exit status of every command,
 // on the sample installation and on temporary files.
 #include <fcntl.h>
+#include <grp.h>
+#include <pwd.h>
 #include <spawn.h>
+#include <sys/resource.h>
+#include <sys/stat.h>
 #include <sys/wait.h>
 #include <unistd.h>
+
+#include <csignal>
 
 #include <algorithm>
 #include <filesystem>
@@ -43,12 +49,21 @@ std::string ReadFile(const std::string& path) {
     return buffer.str();
 }
 
-// Runs tesutil with `arguments`, in an environment without TESSEL_ROOTS plus `environment`.
-ToolRun Tool(const std::vector<std::string>& arguments,
-             const std::vector<std::string>& environment = {}) {
+// How a run is set up beyond its arguments: variables added to an environment without
+// TESSEL_ROOTS, the bytes on standard input, and where standard output goes (a file of the
+// run's own when empty).
+struct RunSetup {
+    std::vector<std::string> environment;
+    std::string input;
+    std::string outputTo;
+};
+
+// Runs tesutil with `arguments`.
+ToolRun Tool(const std::vector<std::string>& arguments, const RunSetup& setup = {}) {
     tesutest::TempDir capture;
-    const std::string outFile = capture.join("out");
+    const std::string outFile = setup.outputTo.empty() ? capture.join("out") : setup.outputTo;
     const std::string errFile = capture.join("err");
+    const std::string inFile = capture.write("in", setup.input);
 
     std::vector<std::string> argStrings = {TESUTIL_EXECUTABLE};
     argStrings.insert(argStrings.end(), arguments.begin(), arguments.end());
@@ -64,7 +79,7 @@ ToolRun Tool(const std::vector<std::string>& arguments,
             envStrings.emplace_back(*entry);
         }
     }
-    envStrings.insert(envStrings.end(), environment.begin(), environment.end());
+    envStrings.insert(envStrings.end(), setup.environment.begin(), setup.environment.end());
     std::vector<char*> envp;
     for (std::string& entry : envStrings) {
         envp.push_back(entry.data());
@@ -73,6 +88,7 @@ ToolRun Tool(const std::vector<std::string>& arguments,
 
     posix_spawn_file_actions_t actions;
     posix_spawn_file_actions_init(&actions);
+    posix_spawn_file_actions_addopen(&actions, 0, inFile.c_str(), O_RDONLY, 0);
     posix_spawn_file_actions_addopen(&actions, 1, outFile.c_str(), O_WRONLY | O_CREAT | O_TRUNC,
                                      0600);
     posix_spawn_file_actions_addopen(&actions, 2, errFile.c_str(), O_WRONLY | O_CREAT | O_TRUNC,
@@ -88,9 +104,14 @@ ToolRun Tool(const std::vector<std::string>& arguments,
     int status = 0;
     waitpid(pid, &status, 0);
     run.status = WIFEXITED(status) ? WEXITSTATUS(status) : 128 + WTERMSIG(status);
-    run.out = ReadFile(outFile);
+    run.out = setup.outputTo.empty() ? ReadFile(outFile) : std::string();
     run.err = ReadFile(errFile);
     return run;
+}
+
+ToolRun Tool(const std::vector<std::string>& arguments,
+             const std::vector<std::string>& environment) {
+    return Tool(arguments, RunSetup{environment, "", ""});
 }
 
 // tesutil with the sample installation as its only root.
@@ -111,33 +132,75 @@ std::string StoredChecksum(const std::string& bytes) {
     return marker == std::string::npos ? std::string() : bytes.substr(marker + 7, 8);
 }
 
-const char* const kCommands[] = {"verify",      "stamp",  "checksum", "filelist",
-                                 "cores-level", "find",   "java",     "version",
-                                 "abspath",     "absdir", "relpath",  "debug-demo"};
+const char* const kCommands[] = {"verify",      "stamp",   "checksum",  "filelist", "roots",
+                                 "cores-level", "find",    "java",      "version",  "abspath",
+                                 "absdir",      "relpath", "debug-demo"};
+
+// True when a line of `text` ends in a blank.
+bool SomeLineEndsInABlank(const std::string& text) {
+    return text.find(" \n") != std::string::npos || text.find("\t\n") != std::string::npos;
+}
 
 TEST(ToolHelp, EveryCommandHasHelpAndTheOverviewListsThemAll) {
     const ToolRun overview = Tool({"--help"});
     EXPECT_EQ(overview.status, 0);
     EXPECT_EQ(overview.err, "");
-    EXPECT_EQ(overview.out.rfind("usage: tesutil [global options] <command>", 0), 0u);
-    for (const char* option : {"--roots DIR[:DIR...]", "--debug LEVEL", "--diag LEVEL"}) {
+    EXPECT_NE(overview.out.find("\nUsage: tesutil [OPTIONS] [SUBCOMMAND]\n"), std::string::npos);
+    EXPECT_FALSE(SomeLineEndsInABlank(overview.out)) << overview.out;
+    for (const char* option :
+         {"--roots DIR[:DIR...]", "--debug LEVEL", "--diag LEVEL", "--version"}) {
         EXPECT_NE(overview.out.find(option), std::string::npos) << option;
     }
+    // A unique beginning of a long option is the option.
+    EXPECT_EQ(Tool({"--he"}).out, overview.out);
     for (const char* command : kCommands) {
         EXPECT_NE(overview.out.find(std::string("\n  ") + command + " "), std::string::npos)
             << command;
         const ToolRun help = Tool({command, "--help"});
         EXPECT_EQ(help.status, 0) << command;
         EXPECT_EQ(help.err, "") << command;
-        EXPECT_EQ(help.out.rfind(std::string("usage: tesutil ") + command + " ", 0), 0u)
+        EXPECT_NE(help.out.find(std::string("\nUsage: tesutil ") + command + " [OPTIONS]"),
+                  std::string::npos)
             << help.out;
+        EXPECT_FALSE(SomeLineEndsInABlank(help.out)) << help.out;
         // -h is the same, and help wins over whatever else was given.
         EXPECT_EQ(Tool({command, "x", "-h"}).out, help.out) << command;
     }
     // After "--" a "--help" is an operand: a file of that name, which does not exist.
     const ToolRun operand = Tool({"checksum", "--", "--help"});
     EXPECT_EQ(operand.status, 1);
-    EXPECT_EQ(operand.err, "tesutil checksum: --help: no such file\n");
+    EXPECT_EQ(operand.err, "tesutil checksum: --help: No such file or directory\n");
+}
+
+TEST(ToolHelp, VersionOptionNamesTheToolAndItsVersion) {
+    const ToolRun run = Tool({"--version"});
+    EXPECT_EQ(run.status, 0);
+    EXPECT_EQ(run.err, "");
+    EXPECT_EQ(run.out, std::string("tesutil ") + TESU_PROJECT_VERSION +
+                           "\nThere is NO WARRANTY, to the extent permitted by law.\n");
+}
+
+TEST(ToolOutput, AFailedWriteToStandardOutputEndsWithStatusOne) {
+    if (!fs::exists("/dev/full")) {
+        GTEST_SKIP() << "no /dev/full here";
+    }
+    tesutest::TempDir dir;
+    const std::string file = dir.write("data.txt", "x\n");
+    const std::vector<std::vector<std::string>> runs = {
+        {"version"},
+        {"--version"},
+        {"--help"},
+        {"verify", "--help"},
+        {"checksum", file},
+        {"verify", file},
+        {"--roots", kSample, "roots"},
+    };
+    for (const auto& arguments : runs) {
+        const ToolRun run = Tool(arguments, RunSetup{{}, "", "/dev/full"});
+        SCOPED_TRACE(arguments.front());
+        EXPECT_EQ(run.status, 1);
+        EXPECT_EQ(run.err, "tesutil: write error: No space left on device\n");
+    }
 }
 
 TEST(ToolUsage, BadUsageGivesStatusTwoAndOneLineNamingTheFault) {
@@ -155,16 +218,21 @@ TEST(ToolUsage, BadUsageGivesStatusTwoAndOneLineNamingTheFault) {
         {{"--diag=loud", "version"},
          "tesutil: unknown diagnostic level 'loud' (silent, reduced, standard, full)"},
         {{"verify"}, "tesutil verify: missing operand (expects FILE...)"},
+        {{"verify", "--s", "a"},
+         "tesutil verify: option '--s' is ambiguous; possibilities: '--status' '--strict'"},
+        {{"verify", "--files-from"}, "tesutil verify: option --files-from needs a value"},
+        {{"verify", "--files-from", "list", "a"},
+         "tesutil verify: extra operand 'a' (file operands cannot be combined with "
+         "--files-from)"},
         {{"stamp"}, "tesutil stamp: missing operand (expects FILE...)"},
-        {{"checksum", "a", "b"}, "tesutil checksum: extra operand 'b' (expects FILE)"},
         {{"filelist", "--paths=yes", "a"}, "tesutil filelist: option --paths takes no value"},
+        {{"filelist", "a", "b"}, "tesutil filelist: extra operand 'b' (expects LIST)"},
         {{"find", "--bogus", "a"}, "tesutil find: unknown option '--bogus'"},
         {{"find"}, "tesutil find: missing operand (expects NAME)"},
         {{"cores-level", "now"}, "tesutil cores-level: extra operand 'now' (expects no operands)"},
-        {{"java", "x"}, "tesutil java: extra operand 'x' (expects no operands)"},
+        {{"java", "--", "x"}, "tesutil java: extra operand 'x' (expects no operands)"},
         {{"version", "-v"}, "tesutil version: unknown option '-v'"},
         {{"abspath", ""}, "tesutil abspath: PATH is empty"},
-        {{"absdir"}, "tesutil absdir: missing operand (expects PATH)"},
         {{"relpath", "base"}, "tesutil relpath: missing operand (expects BASE PATH)"},
         {{"debug-demo", "--debug", "loud"},
          "tesutil debug-demo: unknown debug level 'loud' (off, normal, detailed, verbose)"},
@@ -197,13 +265,17 @@ TEST(ToolSample, CoresLevelFindAndJava) {
     const ToolRun missing = OnSample({"find", "nothing.txt"});
     EXPECT_EQ(missing.status, 1);
     EXPECT_EQ(missing.out, "");
-    EXPECT_EQ(missing.err, "tesutil find: 'nothing.txt' not found under the installation roots\n");
+    EXPECT_EQ(missing.err,
+              "tesutil find: 'nothing.txt' not found under the installation roots "
+              "(looked in " +
+                  kSample + ")\n");
     // The container search looks only inside the container's entries.
     const ToolRun notInEntry = OnSample({"find", "--container", "IPupdate.log"});
     EXPECT_EQ(notInEntry.status, 1);
     EXPECT_EQ(notInEntry.err,
               "tesutil find: 'IPupdate.log' not found in the IP container of any installation "
-              "root\n");
+              "root (looked in " +
+                  kSample + ")\n");
 
     const std::string platform = Port_Env::GetPlatformPath().str();
     const ToolRun java = OnSample({"java"});
@@ -213,12 +285,14 @@ TEST(ToolSample, CoresLevelFindAndJava) {
     } else {
         EXPECT_EQ(java.status, 1);
         EXPECT_EQ(java.err, "tesutil java: no Java runtime java/" + platform +
-                                "/jre/bin/java under the installation roots\n");
+                                "/jre/bin/java under the installation roots (looked in " + kSample +
+                                ")\n");
     }
     tesutest::TempDir empty;
     const ToolRun noJava = Tool({"--roots", empty.path(), "java"});
     EXPECT_EQ(noJava.status, 1);
     EXPECT_EQ(noJava.out, "");
+    EXPECT_NE(noJava.err.find("(looked in " + empty.path() + ")\n"), std::string::npos);
 }
 
 TEST(ToolSample, VersionShowsNameValueBuildStampAndNextMajor) {
@@ -255,6 +329,14 @@ TEST(ToolSample, FileListGivesExistingMembersAndWarnsOfTheMissingOne) {
     const ToolRun silent = OnSample({"--diag", "silent", "filelist", list});
     EXPECT_EQ(silent.err, "");
     EXPECT_EQ(silent.out, members.out);
+
+    // A list that cannot be read is reported once, by the tool, with the system's reason.
+    const ToolRun missing = OnSample({"filelist", kDemo + "/none.lst"});
+    EXPECT_EQ(missing.status, 1);
+    EXPECT_EQ(missing.out, "");
+    EXPECT_EQ(missing.err, "tesutil filelist: " + kDemo + "/none.lst: No such file or directory\n");
+    EXPECT_EQ(OnSample({"filelist", kDemo}).err,
+              "tesutil filelist: " + kDemo + ": Is a directory\n");
 }
 
 TEST(ToolSample, VerifyAndChecksumOnTheStampedSampleFiles) {
@@ -295,13 +377,48 @@ TEST(ToolRoots, DefaultIsTheSampleThenTesselRootsThenTheOption) {
               "Cores Update # 99\n");
 }
 
+TEST(ToolRoots, RootsCommandShowsEachRootWithItsOriginAndMarksTheMissing) {
+    tesutest::TempDir other;
+    const std::string gone = other.join("gone");
+    struct Case {
+        std::vector<std::string> arguments;
+        std::vector<std::string> environment;
+        std::string out;
+    };
+    const Case cases[] = {
+        {{"roots"}, {}, kSample + "  (sample installation)\n"},
+        {{"roots"},
+         {"TESSEL_ROOTS=" + other.path() + ":" + gone},
+         other.path() + "  (TESSEL_ROOTS)\n" + gone + "  (TESSEL_ROOTS, missing)\n"},
+        {{"--roots", gone + ":" + kSample, "roots"},
+         {"TESSEL_ROOTS=" + other.path()},
+         gone + "  (--roots, missing)\n" + kSample + "  (--roots)\n"},
+    };
+    for (const Case& c : cases) {
+        const ToolRun run = Tool(c.arguments, c.environment);
+        EXPECT_EQ(run.status, 0);
+        EXPECT_EQ(run.out, c.out);
+        EXPECT_EQ(run.err, "");
+    }
+    const ToolRun none = Tool({"roots"}, {"TESSEL_ROOTS="});
+    EXPECT_EQ(none.status, 1);
+    EXPECT_EQ(none.out, "");
+    EXPECT_EQ(none.err, "tesutil roots: no installation roots (TESSEL_ROOTS gives none)\n");
+}
+
 TEST(ToolRoots, CoresLevelFailuresSayWhatIsMissing) {
     tesutest::TempDir root;
     const ToolRun none = Tool({"--roots", root.path(), "cores-level"});
     EXPECT_EQ(none.status, 1);
     EXPECT_EQ(none.out, "");
     EXPECT_EQ(none.err,
-              "tesutil cores-level: no installation root holds a readable IPupdate.log\n");
+              "tesutil cores-level: no installation root holds a readable IPupdate.log "
+              "(looked in " +
+                  root.path() + ")\n");
+    const ToolRun noRoots = Tool({"cores-level"}, {"TESSEL_ROOTS="});
+    EXPECT_EQ(noRoots.err,
+              "tesutil cores-level: no installation root holds a readable "
+              "IPupdate.log (looked in no installation roots)\n");
 
     root.write("IPupdate.log", "update started\nupdate finished\n");
     const ToolRun untagged = Tool({"--roots", root.path(), "cores-level"});
@@ -311,16 +428,15 @@ TEST(ToolRoots, CoresLevelFailuresSayWhatIsMissing) {
 }
 
 TEST(ToolDiagnostics, DiagAndDebugLevelsGovernWhatReachesStandardError) {
+    // The tool's own failure lines do not depend on the level: they are not library messages.
     tesutest::TempDir dir;
     const std::string missing = dir.join("missing.txt");
-    const ToolRun standard = Tool({"verify", missing});
-    EXPECT_EQ(standard.status, 1);
-    EXPECT_EQ(standard.out, missing + ": no such file\n");
-    EXPECT_EQ(standard.err, "ERROR:tesutil - Could not open " + missing + "\n");
-    const ToolRun silent = Tool({"--diag", "silent", "verify", missing});
-    EXPECT_EQ(silent.status, 1);
-    EXPECT_EQ(silent.out, standard.out);
-    EXPECT_EQ(silent.err, "");
+    for (const char* level : {"silent", "standard"}) {
+        const ToolRun run = Tool({"--diag", level, "verify", missing});
+        EXPECT_EQ(run.status, 1);
+        EXPECT_EQ(run.out, "");
+        EXPECT_EQ(run.err, "tesutil verify: " + missing + ": No such file or directory\n");
+    }
 
     // Debug lines are status messages: shown from the standard level up, at the logger's level.
     const std::string trace =
@@ -347,30 +463,116 @@ TEST(ToolDiagnostics, DiagAndDebugLevelsGovernWhatReachesStandardError) {
     EXPECT_EQ(normal.err.find("a detailed line"), std::string::npos);
 }
 
-TEST(ToolFiles, VerifyReportsEachFileAndFailsWhenAnyIsNotOk) {
+TEST(ToolFiles, VerifyOptionsDecideWhatIsPrintedAndTheStatus) {
     tesutest::TempDir dir;
     const std::string plain = dir.write("plain.txt", "no checksum line here\n");
     const std::string good =
         dir.write("good.txt", "# CRC: " + ChecksumOf("alpha\nbeta\n") + "\nalpha\nbeta\n");
     const std::string bad = dir.write("bad.txt", "# CRC: " + ChecksumOf("alpha\n") + "\nomega\n");
     const std::string subdir = dir.mkdir("sub");
-
-    const ToolRun ok = Tool({"verify", plain, good});
-    EXPECT_EQ(ok.status, 0);
-    EXPECT_EQ(ok.out, plain + ": OK\n" + good + ": OK\n");
-
-    const ToolRun mixed = Tool({"verify", bad, subdir, good});
-    EXPECT_EQ(mixed.status, 1);
-    EXPECT_EQ(mixed.out, bad + ": FAILED\n" + subdir + ": is a directory\n" + good + ": OK\n");
-    EXPECT_EQ(mixed.err, "ERROR:tesutil - Could not open " + subdir + "\n");
-
-    // A name that begins with "-" after "--"; the message shows the name as given, "%" and all.
+    const std::string missing = dir.join("%s%n.txt");  // shown as given, "%" and all
+    const std::string unreadable = "tesutil verify: " + missing +
+                                   ": No such file or directory\ntesutil verify: " + subdir +
+                                   ": Is a directory\n";
+    struct Case {
+        std::vector<std::string> arguments;
+        int status;
+        std::string out;
+        std::string err;
+    };
+    const Case cases[] = {
+        {{plain, good}, 0, plain + ": OK\n" + good + ": OK\n", ""},
+        {{bad, missing, good, subdir}, 1, bad + ": FAILED\n" + good + ": OK\n", unreadable},
+        {{"--quiet", bad, missing, good, subdir}, 1, bad + ": FAILED\n", unreadable},
+        {{"-q", good}, 0, "", ""},
+        {{"--status", bad, missing, good, subdir}, 1, "", ""},
+        {{"--status", good, plain}, 0, "", ""},
+        {{"--strict", plain, good},
+         1,
+         plain + ": FAILED (no checksum line)\n" + good + ": OK\n",
+         ""},
+        {{"--str", "--qu", plain, good}, 1, plain + ": FAILED (no checksum line)\n", ""},
+    };
+    for (const Case& c : cases) {
+        std::vector<std::string> arguments = {"verify"};
+        arguments.insert(arguments.end(), c.arguments.begin(), c.arguments.end());
+        const ToolRun run = Tool(arguments);
+        SCOPED_TRACE(c.arguments.front());
+        EXPECT_EQ(run.status, c.status);
+        EXPECT_EQ(run.out, c.out);
+        EXPECT_EQ(run.err, c.err);
+    }
+    // A name that begins with "-" after "--".
     const std::string odd = dir.write("-100%s.txt", "data\n");
-    const ToolRun dashed = Tool({"verify", "--", odd});
-    EXPECT_EQ(dashed.status, 0);
-    EXPECT_EQ(dashed.out, odd + ": OK\n");
-    const ToolRun oddMissing = Tool({"verify", dir.join("%s%n.txt")});
-    EXPECT_EQ(oddMissing.err, "ERROR:tesutil - Could not open " + dir.join("%s%n.txt") + "\n");
+    EXPECT_EQ(Tool({"verify", "--", odd}).out, odd + ": OK\n");
+    if (geteuid() != 0) {
+        fs::permissions(good, fs::perms::none);
+        EXPECT_EQ(Tool({"verify", good}).err, "tesutil verify: " + good + ": Permission denied\n");
+    }
+}
+
+TEST(ToolFiles, ChecksumOfSeveralFilesOfStandardInputAndOfAList) {
+    tesutest::TempDir dir;
+    const std::string one = dir.write("one.txt", "ab\r\n# note\ncd\n");  // lines without "#"
+    const std::string two = dir.write("two.txt", "x\n");
+    const std::string missing = dir.join("none.txt");
+    const std::string list = dir.write("names.lst", one + "\n\n" + missing + "\r\n" + two + "\n");
+    const std::string c1 = ChecksumOf("abcd");
+    const std::string c2 = ChecksumOf("x");
+    const std::string gone = "tesutil checksum: " + missing + ": No such file or directory\n";
+    struct Case {
+        std::vector<std::string> arguments;
+        std::string input;
+        int status;
+        std::string out;
+        std::string err;
+    };
+    const Case cases[] = {
+        // One operand: the bare checksum, as before; several: "<checksum>  <name>" lines.
+        {{one}, "", 0, c1 + "\n", ""},
+        {{one, missing, two}, "", 1, c1 + "  " + one + "\n" + c2 + "  " + two + "\n", gone},
+        {{"-"}, "x\n", 0, c2 + "\n", ""},
+        {{two, "-"}, "ab\ncd", 0, c2 + "  " + two + "\n" + c1 + "  -\n", ""},
+        // A list: one name a line, empty lines skipped, CR-LF ends taken as ends.
+        {{"--files-from", list}, "", 1, c1 + "  " + one + "\n" + c2 + "  " + two + "\n", gone},
+        {{"--files-from", "-"}, two + "\n", 0, c2 + "  " + two + "\n", ""},
+        {{"--files-from=-"},
+         "-\n",
+         1,
+         "",
+         "tesutil checksum: when reading file names from standard input, no file name of '-' "
+         "allowed\n"},
+        {{"--files-from", missing}, "", 1, "", gone},
+        {{dir.path()}, "", 1, "", "tesutil checksum: " + dir.path() + ": Is a directory\n"},
+    };
+    for (const Case& c : cases) {
+        std::vector<std::string> arguments = {"checksum"};
+        arguments.insert(arguments.end(), c.arguments.begin(), c.arguments.end());
+        const ToolRun run = Tool(arguments, RunSetup{{}, c.input, ""});
+        SCOPED_TRACE(c.arguments.back());
+        EXPECT_EQ(run.status, c.status);
+        EXPECT_EQ(run.out, c.out);
+        EXPECT_EQ(run.err, c.err);
+    }
+    // verify reads standard input and lists the same way.
+    const std::string stamped = "# CRC: " + c2 + "\nx\n";
+    EXPECT_EQ(Tool({"verify", "-"}, RunSetup{{}, stamped, ""}).out, "-: OK\n");
+    EXPECT_EQ(Tool({"verify", "--files-from", "-"}, RunSetup{{}, two + "\n", ""}).out,
+              two + ": OK\n");
+}
+
+TEST(ToolFiles, NamesWithALineBreakOrABackslashAreEscaped) {
+    tesutest::TempDir dir;
+    const std::string name = dir.write("two\nlines.txt", "x\n");
+    const std::string shown = dir.path() + "/two\\nlines.txt";
+    const std::string checksum = ChecksumOf("x");
+    EXPECT_EQ(Tool({"checksum", name, name}).out,
+              "\\" + checksum + "  " + shown + "\n\\" + checksum + "  " + shown + "\n");
+    EXPECT_EQ(Tool({"verify", name}).out, "\\" + shown + ": OK\n");
+    EXPECT_EQ(Tool({"stamp", name}).out, "\\" + shown + ": stamped (# CRC: " + checksum + ")\n");
+    // One failure stays one line on the standard error stream.
+    const ToolRun missing = Tool({"verify", "a\\b\nc"});
+    EXPECT_EQ(missing.err, "tesutil verify: a\\\\b\\nc: No such file or directory\n");
 }
 
 TEST(ToolFiles, StampThenVerifyKeepsCrLfEndsAndCommentLines) {
@@ -428,8 +630,16 @@ TEST(ToolFiles, StampRefreshesTheLineTheCheckReads) {
         {"only", "# CRC: @\nonly"},
         {"", "# CRC: @\n"},
     };
-    for (const Case& c : cases) {
-        SCOPED_TRACE(c.before);
+    // The file is copied in blocks of 256 KiB: the field may begin just before a block's end,
+    // at it, or the marker may straddle it.
+    std::vector<Case> all(std::begin(cases), std::end(cases));
+    const std::size_t block = 256 * 1024;
+    for (const std::size_t before : {block - 10, block - 6, block - 3, block}) {
+        const std::string data = std::string(before - 1, 'd') + "\n";
+        all.push_back({data + "# CRC: 12345678 tail\nz\n", data + "# CRC: @ tail\nz\n"});
+    }
+    for (const Case& c : all) {
+        SCOPED_TRACE(c.before.substr(0, 40));
         const std::string file = dir.write("case.txt", c.before);
         const ToolRun stamp = Tool({"stamp", file});
         EXPECT_EQ(stamp.status, 0) << stamp.err;
@@ -454,8 +664,9 @@ TEST(ToolFiles, StampKeepsPermissionsAndLinksAndGoesOnPastBadFiles) {
     const ToolRun run = Tool({"stamp", missing, link, subdir});
     EXPECT_EQ(run.status, 1);
     EXPECT_EQ(run.out, link + ": stamped (# CRC: " + ChecksumOf("value = 1\n") + ")\n");
-    EXPECT_EQ(run.err, "tesutil stamp: " + missing + ": no such file\ntesutil stamp: " + subdir +
-                           ": is a directory\n");
+    EXPECT_EQ(run.err, "tesutil stamp: " + missing +
+                           ": No such file or directory\ntesutil stamp: " + subdir +
+                           ": Is a directory\n");
     EXPECT_TRUE(fs::is_symlink(link));
     EXPECT_EQ(fs::status(target).permissions(),
               fs::perms::owner_read | fs::perms::owner_write | fs::perms::group_read);
@@ -463,28 +674,104 @@ TEST(ToolFiles, StampKeepsPermissionsAndLinksAndGoesOnPastBadFiles) {
     EXPECT_FALSE(fs::exists(missing));
 }
 
-TEST(ToolFiles, ChecksumAndFileListFailuresNameTheFile) {
-    tesutest::TempDir dir;
-    const std::string missing = dir.join("none.txt");
-    const ToolRun checksum = Tool({"checksum", missing});
-    EXPECT_EQ(checksum.status, 1);
-    EXPECT_EQ(checksum.out, "");
-    EXPECT_EQ(checksum.err, "tesutil checksum: " + missing + ": no such file\n");
-    EXPECT_EQ(Tool({"checksum", dir.path()}).err,
-              "tesutil checksum: " + dir.path() + ": is a directory\n");
-    // Only lines without "#" count, CR-LF or not.
-    const std::string mixed = dir.write("mixed.txt", "ab\r\n# note\ncd\n");
-    EXPECT_EQ(Tool({"checksum", mixed}).out, ChecksumOf("abcd") + "\n");
+// The entries of a directory, by name.
+std::vector<std::string> Entries(const std::string& directory) {
+    std::vector<std::string> names;
+    for (const auto& entry : fs::directory_iterator(directory)) {
+        names.push_back(entry.path().filename().string());
+    }
+    std::sort(names.begin(), names.end());
+    return names;
+}
 
-    const ToolRun list = Tool({"filelist", missing});
-    EXPECT_EQ(list.status, 1);
-    EXPECT_EQ(list.out, "");
-    EXPECT_EQ(list.err, "ERROR:tesutil - Cannot read " + missing +
-                            "\ntesutil filelist: " + missing + ": no such file\n");
-    const ToolRun listDir = Tool({"filelist", dir.path()});
-    EXPECT_EQ(listDir.status, 1);
-    EXPECT_EQ(listDir.err, "ERROR:tesutil - Cannot open " + dir.path() +
-                               "\ntesutil filelist: " + dir.path() + ": is a directory\n");
+TEST(ToolStamp, KeepsTheOwnerGroupAndModeOfAnotherUsersFile) {
+    if (geteuid() != 0) {
+        GTEST_SKIP() << "only root can give a file to another user";
+    }
+    const struct passwd* nobody = getpwnam("nobody");
+    const struct group* nogroup = getgrnam("nogroup");
+    if (nobody == nullptr || nogroup == nullptr) {
+        GTEST_SKIP() << "no user nobody or group nogroup here";
+    }
+    tesutest::TempDir dir;
+    const std::string file = dir.write("theirs.cfg", "value = 1\n");
+    ASSERT_EQ(chown(file.c_str(), nobody->pw_uid, nogroup->gr_gid), 0);
+    ASSERT_EQ(chmod(file.c_str(), 0640), 0);
+    const ToolRun run = Tool({"stamp", file});
+    EXPECT_EQ(run.status, 0) << run.err;
+    struct stat info;
+    ASSERT_EQ(stat(file.c_str(), &info), 0);
+    EXPECT_EQ(info.st_uid, nobody->pw_uid);
+    EXPECT_EQ(info.st_gid, nogroup->gr_gid);
+    EXPECT_EQ(info.st_mode & 07777, 0640u);
+    EXPECT_EQ(ReadFile(file), "# CRC: " + ChecksumOf("value = 1\n") + "\nvalue = 1\n");
+}
+
+TEST(ToolStamp, RefusesHardLinkedAndReadOnlyFilesUnlessForced) {
+    tesutest::TempDir dir;
+    const std::string text = "value = 2\n";
+    const std::string stamped = "# CRC: " + ChecksumOf(text) + "\n" + text;
+    const std::string linked = dir.write("linked.cfg", text);
+    const std::string other = dir.join("other-name.cfg");
+    fs::create_hard_link(linked, other);
+    const ToolRun refused = Tool({"stamp", linked});
+    EXPECT_EQ(refused.status, 1);
+    EXPECT_EQ(refused.out, "");
+    EXPECT_EQ(refused.err, "tesutil stamp: " + linked +
+                               ": it has 2 hard links, which replacing it would part from the "
+                               "new text; --force rewrites it in place\n");
+    EXPECT_EQ(ReadFile(linked), text);
+    // Forced, it is rewritten in place: both names see the new text.
+    const ToolRun forced = Tool({"stamp", "--force", linked});
+    EXPECT_EQ(forced.status, 0) << forced.err;
+    EXPECT_EQ(ReadFile(linked), stamped);
+    EXPECT_EQ(ReadFile(other), stamped);
+    EXPECT_EQ(fs::hard_link_count(linked), 2u);
+
+    const std::string readOnly = dir.write("read-only.cfg", text);
+    fs::permissions(readOnly, fs::perms::owner_read | fs::perms::group_read);
+    const ToolRun kept = Tool({"stamp", readOnly});
+    EXPECT_EQ(kept.status, 1);
+    EXPECT_EQ(kept.err,
+              "tesutil stamp: " + readOnly +
+                  (geteuid() == 0 ? ": the file is read-only; --force stamps it all the same\n"
+                                  : ": Permission denied\n"));
+    EXPECT_EQ(ReadFile(readOnly), text);
+    if (geteuid() == 0) {
+        EXPECT_EQ(Tool({"stamp", "-f", readOnly}).status, 0);
+        EXPECT_EQ(ReadFile(readOnly), stamped);
+        EXPECT_EQ(fs::status(readOnly).permissions(),
+                  fs::perms::owner_read | fs::perms::group_read);
+    }
+    EXPECT_EQ(Entries(dir.path()),
+              (std::vector<std::string>{"linked.cfg", "other-name.cfg", "read-only.cfg"}));
+}
+
+TEST(ToolStamp, AFailedWriteLeavesTheFileAndNoTemporaryFile) {
+    // A file size limit below the new text's size makes the writes to the temporary file fail
+    // (the limit and the ignored SIGXFSZ are inherited by the tool).
+    tesutest::TempDir dir;
+    const std::string text(200 * 1024, 'x');
+    const std::string file = dir.write("big.cfg", text);
+    struct rlimit saved;
+    ASSERT_EQ(getrlimit(RLIMIT_FSIZE, &saved), 0);
+    struct rlimit limited = saved;
+    limited.rlim_cur = 64 * 1024;
+    void (*savedHandler)(int) = signal(SIGXFSZ, SIG_IGN);
+    ASSERT_EQ(setrlimit(RLIMIT_FSIZE, &limited), 0);
+    const ToolRun run = Tool({"stamp", file});
+    setrlimit(RLIMIT_FSIZE, &saved);
+    signal(SIGXFSZ, savedHandler);
+    EXPECT_EQ(run.status, 1);
+    EXPECT_EQ(run.out, "");
+    EXPECT_EQ(run.err.rfind("tesutil stamp: " + file + ": cannot write the temporary file " +
+                                dir.path() + "/.big.cfg.",
+                            0),
+              0u)
+        << run.err;
+    EXPECT_NE(run.err.find(".tmp: File too large\n"), std::string::npos) << run.err;
+    EXPECT_EQ(ReadFile(file), text);
+    EXPECT_EQ(Entries(dir.path()), std::vector<std::string>{"big.cfg"});
 }
 
 TEST(ToolPaths, AbsPathAbsDirAndRelPath) {
