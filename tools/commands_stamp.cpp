@@ -207,14 +207,9 @@ std::string StampOne(const std::string& name, bool force, std::string& checksum)
         throw StampFailure{"Is a directory"};
     }
     if (!status.regular) {
-        throw StampFailure{"not a regular file"};
+        throw StampFailure{"Not a regular file"};
     }
-    if (!Port::File::canwrite(target)) {
-        throw StampFailure{Port::File::lastError().str()};
-    }
-    if ((status.permissions & 0222) == 0 && !force) {
-        throw StampFailure{"the file is read-only; --force stamps it all the same"};
-    }
+    // Whether the file may be written matters only once there is something to write.
     Tesu::ChecksumScan scan;
     if (Tesu::Utilities::ScanChecksummedFile(target, scan) != 0) {
         throw StampFailure{scan.reason.str()};
@@ -222,6 +217,12 @@ std::string StampOne(const std::string& name, bool force, std::string& checksum)
     checksum = scan.checksum.str();
     if (scan.marked && scan.markerField.str() == " " + checksum) {
         return "already stamped";
+    }
+    if (!Port::File::canwrite(target)) {
+        throw StampFailure{Port::File::lastError().str()};
+    }
+    if ((status.permissions & 0222) == 0 && !force) {
+        throw StampFailure{"the file is read-only; --force stamps it all the same"};
     }
     bool inPlace = false;
     if (status.links > 1) {
