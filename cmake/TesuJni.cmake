@@ -16,7 +16,7 @@ endif()
 
 add_library(tesu_jni INTERFACE)
 if(TESU_HAVE_JNI_H)
-  list(GET TESU_JNI_INCLUDE_DIRS -1 _tesu_jni_shown)
+  list(GET TESU_JNI_INCLUDE_DIRS 0 _tesu_jni_shown)
   message(STATUS "JNI: the JDK's jni.h (${_tesu_jni_shown})")
   target_include_directories(tesu_jni INTERFACE ${TESU_JNI_INCLUDE_DIRS})
   target_compile_definitions(tesu_jni INTERFACE TESU_HAVE_JNI_H)
