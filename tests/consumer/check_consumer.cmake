@@ -62,8 +62,8 @@ endforeach()
 # The bridge's header declares the JNI types as the JDK's jni.h does: in C and C++, alone and
 # with jni.h on either side of it, its functions have the type of a JNI native method.
 set(bridge Tesu_Tessel2MessageCatcher.h)
-set(use "void (TESU_JNI_CALL *const method)(JNIEnv*, jobject, jstring) =\n"
-        "    &Java_com_quarnel_tesutil_tessel2_Tessel2MessageCatcher_outputInfoMessageN;\n")
+string(CONCAT use "void (TESU_JNI_CALL *const method)(JNIEnv*, jobject, jstring) =\n"
+       "    &Java_com_quarnel_tesutil_tessel2_Tessel2MessageCatcher_outputInfoMessageN;\n")
 set(orders "${bridge}")
 set(jni_flags)
 if(JNI_INCLUDE_DIRS)
@@ -78,7 +78,7 @@ foreach(order IN LISTS orders)
   foreach(header IN LISTS order)
     string(APPEND text "#include \"${header}\"\n")
   endforeach()
-  string(APPEND text ${use})
+  string(APPEND text "${use}")
   math(EXPR case "${case} + 1")
   foreach(language c cpp)
     set(source ${WORK_DIR}/headers/bridge_${case}.${language})
