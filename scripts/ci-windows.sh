@@ -93,26 +93,31 @@ probe() {
   export WINEPREFIX
   WINEPREFIX="$(cd "$build" && pwd)/wineprefix"
   local status=0
-  timeout 300 "$loader" "$exe" >"$log" 2>&1 || status=$?
+  # Through bash's exec, so that a loader the kernel cannot run says so ("Exec format error").
+  timeout 300 bash -c 'exec "$@"' probe "$loader" "$exe" >"$log" 2>&1 || status=$?
   if [ $status -eq 0 ] && grep -q '^probe runs' "$log"; then
     return 0
   fi
   local said
-  said=$(grep -v '^[[:space:]]*$' "$log" | tail -n 1 || true)
+  # What the loader said: its first line that names an error, else its last line.
+  said=$(grep -m 1 -iE 'error|cannot|not found' "$log" || grep -v '^[[:space:]]*$' "$log" |
+         tail -n 1 || true)
+  said=${said#probe: line 1: }
   probe_reason="$loader exited with status $status${said:+: $said}"
   [ $status -eq 124 ] && probe_reason="$loader did not finish within 300 s"
   return 1
 }
 
 declare -A runs reason
+declare -A width=([x86_64]=64-bit [i686]=32-bit)
 for arch in x86_64 i686; do
   if probe "$arch"; then
     runs[$arch]=yes
-    echo "== Probe: a $arch Windows program runs under $(loader_of "$arch")"
+    echo "== Probe: a ${width[$arch]} Windows program runs under $(loader_of "$arch")"
   else
     runs[$arch]=no
     reason[$arch]=$probe_reason
-    echo "== Probe: a $arch Windows program does not run ($probe_reason)"
+    echo "== Probe: a ${width[$arch]} Windows program does not run ($probe_reason)"
   fi
   wineserver -k >/dev/null 2>&1 || true
 done
@@ -260,7 +265,7 @@ for arch in x86_64 i686; do
   fi
 done
 for arch in "${not_run[@]}"; do
-  echo "windows-$arch: unit tests NOT run: a $arch Windows program does not run on this" \
+  echo "windows-$arch: unit tests NOT run: a ${width[$arch]} Windows program does not run on this" \
     "machine (${reason[$arch]}); library and tool built, exports checked"
 done
 
