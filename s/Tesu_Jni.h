@@ -33,7 +33,7 @@ struct JNINativeInterface_ {
     void* notDeclared[165];  // GetVersion (4) to GetStringUTFLength (168)
     const char*(JNICALL* GetStringUTFChars)(JNIEnv* env, jstring str, jboolean* isCopy);
     void(JNICALL* ReleaseStringUTFChars)(JNIEnv* env, jstring str, const char* chars);
-    // The entries after these are not declared: the table is only read, never made, here.
+    // The entries after these are not declared: the bridge reads none of them.
 };
 
 struct JNIEnv_ {
