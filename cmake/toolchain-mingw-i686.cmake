@@ -9,5 +9,6 @@ set(TESU_MINGW_TRIPLE i686-w64-mingw32)
 # reading less than the one before it). Every x86 processor since 2001 has SSE2.
 set(CMAKE_C_FLAGS_INIT "-msse2 -mfpmath=sse")
 set(CMAKE_CXX_FLAGS_INIT "-msse2 -mfpmath=sse")
+set(TESU_WINE_NAMES wine)
 
 include(${CMAKE_CURRENT_LIST_DIR}/toolchain-mingw-common.cmake)

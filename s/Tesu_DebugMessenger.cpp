@@ -76,7 +76,35 @@ LoggerTable* const loggerTable = MakeLoggerTable();
 // bridge looks "javavm" up on whatever Java thread calls it, so a first lookup on two threads at
 // once must not corrupt the table. Uncontended, it costs a few nanoseconds per lookup. (A
 // std::mutex has a constant initialiser and nothing to destroy at unload.)
+//
+// Nothing allocates while it is held: a host's own operator new (a tracing allocator, say) may
+// ask the registry for a logger, and would otherwise wait for the lock its own thread holds.
+// Loggers, table nodes and bucket arrays are made outside it, and only linked in under it.
 std::mutex loggerTableMutex;
+
+// Deletes a logger that no caller has seen (the loser of two first requests, or one whose
+// insertion failed) without a word: registry loggers never write the total-time line.
+struct DiscardSilently {
+    void operator()(DebugMessenger* logger) const {
+        logger->SetLevel(DebugMessenger::DEBUG_OFF);
+        delete logger;
+    }
+};
+using PendingLogger = std::unique_ptr<DebugMessenger, DiscardSilently>;
+
+// A table node holding `name` and `logger`, made through a table of its own so that the
+// registry's table need only link it in.
+LoggerTable::node_type MakeNode(const Port::StringBase<char>& name, DebugMessenger* logger) {
+    LoggerTable scratch;
+    return scratch.extract(scratch.emplace(name, logger).first);
+}
+
+// Whether `table` holds `entries` entries without growing its bucket array: the table grows
+// when its entries would exceed the bucket count times the maximum load factor.
+bool HoldsWithoutGrowing(const LoggerTable& table, std::size_t entries) {
+    return static_cast<double>(entries) <=
+           static_cast<double>(table.bucket_count()) * static_cast<double>(table.max_load_factor());
+}
 
 }  // namespace
 
@@ -163,25 +191,67 @@ DebugMessenger* DebugMessengerFactory::GetLogger(const Port::StringBase<char>& n
     if (IsRootName(name)) {
         return rootLogger;
     }
-    const std::lock_guard<std::mutex> lock(loggerTableMutex);
-    const auto found = loggerTable->find(name);
-    if (found != loggerTable->end()) {
-        return found->second;
+    {
+        const std::lock_guard<std::mutex> lock(loggerTableMutex);
+        const auto found = loggerTable->find(name);
+        if (found != loggerTable->end()) {
+            return found->second;
+        }
     }
-    // Held by a unique_ptr until the table has taken it, so that a failed insertion leaks
-    // nothing.
-    std::unique_ptr<DebugMessenger> logger(new DebugMessenger(rootLogger, name));
-    loggerTable->emplace(name, logger.get());
-    return logger.release();
+    // A first request: the logger and its table node are made outside the lock. Should another
+    // request for the name have come in meanwhile, its logger is kept and ours discarded.
+    PendingLogger logger(new DebugMessenger(rootLogger, name));
+    LoggerTable::node_type node = MakeNode(name, logger.get());
+    LoggerTable spare;  // a larger bucket array, when the table must grow; freed after the lock
+    for (;;) {
+        std::size_t entries = 0;
+        {
+            const std::lock_guard<std::mutex> lock(loggerTableMutex);
+            const auto found = loggerTable->find(name);
+            if (found != loggerTable->end()) {
+                return found->second;
+            }
+            entries = loggerTable->size() + 1;
+            if (!HoldsWithoutGrowing(*loggerTable, entries) &&
+                HoldsWithoutGrowing(spare, entries)) {
+                // Grow by moving the nodes into the spare buckets; nothing is copied.
+                loggerTable->swap(spare);
+                loggerTable->merge(spare);
+            }
+            if (HoldsWithoutGrowing(*loggerTable, entries)) {
+                loggerTable->insert(std::move(node));
+                return logger.release();
+            }
+        }
+        spare = LoggerTable(2 * entries + 2);
+        spare.max_load_factor(kMaxLoadFactor);
+    }
 }
 
 std::vector<Port::StringBase<char>>* DebugMessengerFactory::GetActiveLoggers() {
     std::unique_ptr<std::vector<Port::StringBase<char>>> names(
         new std::vector<Port::StringBase<char>>());
-    const std::lock_guard<std::mutex> lock(loggerTableMutex);
-    names->reserve(loggerTable->size());
-    for (const auto& entry : *loggerTable) {
-        names->push_back(entry.first);
+    // Under the lock only the addresses of the names are taken, into room reserved beforehand;
+    // the names themselves are copied after it. Entries are never removed or changed, and
+    // growing the table moves no node, so the addresses stay good.
+    std::vector<const Port::StringBase<char>*> keys;
+    for (;;) {
+        std::size_t entries = 0;
+        {
+            const std::lock_guard<std::mutex> lock(loggerTableMutex);
+            entries = loggerTable->size();
+            if (entries <= keys.capacity()) {
+                for (const auto& entry : *loggerTable) {
+                    keys.push_back(&entry.first);
+                }
+                break;
+            }
+        }
+        keys.reserve(entries + entries / 2);
+    }
+    names->reserve(keys.size());
+    for (const Port::StringBase<char>* key : keys) {
+        names->push_back(*key);
     }
     return names.release();
 }

@@ -81,7 +81,9 @@ class TESU_API DebugMessenger {
         const DebugMessenger* logger = this;
         while (logger->level == DEBUG_INHERIT) {
             if (logger->parent == nullptr) {
-                return DEBUG_OFF;  // a chain without a level writes nothing
+                // A chain without a level counts as DEBUG_OFF: lines of level DEBUG_OFF (or
+                // DEBUG_INHERIT) are still written, as they are at every level.
+                return DEBUG_OFF;
             }
             logger = logger->parent;
         }
@@ -103,7 +105,8 @@ class TESU_API DebugMessenger {
 // every pointer it hands out stays valid until the process ends; callers never delete them.
 // Lookups and the listing hold a lock of the registry's own, so that first requests on several
 // threads (the Java bridge's, for one) are safe; the loggers handed out lock nothing, and their
-// users serialise the calls that change them (levels, timers).
+// users serialise the calls that change them (levels, timers). Nothing is allocated while that
+// lock is held, so a host's own operator new may itself ask the registry for a logger.
 class TESU_API DebugMessengerFactory {
   public:
     DebugMessengerFactory() = delete;
@@ -112,6 +115,8 @@ class TESU_API DebugMessengerFactory {
     static DebugMessenger* GetLogger();
     // The root for "root" (in any letter case); otherwise the logger of exactly that name
     // (case counts), made on first request as a child of the root at DEBUG_INHERIT. Never null.
+    // A first request that runs out of memory throws std::bad_alloc and enters nothing; the
+    // logger it had begun is discarded without writing a line.
     static DebugMessenger* GetLogger(const Port::StringBase<char>& name);
     // A new vector with the names of every named logger made so far (never "root"), in the
     // table's own order. The caller owns the vector and deletes it.

@@ -61,18 +61,20 @@ MsgMan::MsgMan(const DiagnosticLevel& level) : msgStream(nullptr), diagnosticLev
             break;
     }
     // Deactivate the managers already registered, then register our own message stream last.
-    // Should either step throw, the managers deactivated so far are activated again before
-    // the exception passes on, so that a failed construction does not leave the process's
-    // other managers silent.
-    std::vector<Port_MsgMan*> deactivated;
+    // Should either step throw, the managers that were active before this construction turned
+    // them off are activated again before the exception passes on: a failed construction
+    // leaves no manager silent, and keeps silent those that an older MsgMan still silences.
+    std::vector<Port_MsgMan*> wereActive;
     try {
-        forEachRegisteredManager([&deactivated](Port_MsgMan* manager) {
-            deactivated.push_back(manager);
+        forEachRegisteredManager([&wereActive](Port_MsgMan* manager) {
+            if (manager->isActive()) {
+                wereActive.push_back(manager);
+            }
             manager->deactivate();
         });
         Port_MsgDispatcher::addMsgMan(&msgStream);
     } catch (...) {
-        for (Port_MsgMan* manager : deactivated) {
+        for (Port_MsgMan* manager : wereActive) {
             try {
                 manager->activate();
             } catch (...) {
@@ -85,7 +87,18 @@ MsgMan::MsgMan(const DiagnosticLevel& level) : msgStream(nullptr), diagnosticLev
 
 MsgMan::~MsgMan() {
     Port_MsgDispatcher::removeMsgMan(&msgStream);
-    forEachRegisteredManager([](Port_MsgMan* manager) { manager->activate(); });
+    // A destructor must not throw: a manager whose activate throws is passed over, and the
+    // others are activated all the same.
+    try {
+        forEachRegisteredManager([](Port_MsgMan* manager) {
+            try {
+                manager->activate();
+            } catch (...) {
+            }
+        });
+    } catch (...) {
+        // Taking the list failed (out of memory): the others stay as they are.
+    }
 }
 
 void MsgMan::addMsgStream(std::ostream& stream) {

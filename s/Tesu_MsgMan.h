@@ -18,8 +18,11 @@ namespace Tesu {
 // Construction adds std::cerr to its message stream with the switches of the diagnostic
 // level, calls deactivate() on every manager already registered, then registers its message
 // stream; destruction unregisters it and calls activate() on every manager still registered.
-// If construction fails (an exception from the layer), the exception passes to the caller,
-// nothing is registered, and the managers already deactivated are activated again.
+// If construction fails (an exception from the layer or from a manager's deactivate), the
+// exception passes to the caller, nothing is registered, and the managers that were active
+// before it deactivated them are activated again (one silenced by an older MsgMan stays so).
+// Destruction throws nothing: should a manager's activate throw, the exception is dropped and
+// the remaining managers are activated all the same.
 // The level governs std::cerr only; a stream added later gets the message stream's defaults
 // (every type on). The object belongs to whoever made it; it is neither copied nor moved.
 class TESU_API MsgMan {

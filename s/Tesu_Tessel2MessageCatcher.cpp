@@ -1,5 +1,7 @@
 #include "Tesu_Tessel2MessageCatcher.h"
 
+#include "Tesu_Jni.h"
+
 #include "Port_Init.h"
 #include "Port_Msg.h"
 #include "Port_String.h"
@@ -41,32 +43,40 @@ void withJavaText(JNIEnv* env, jstring text, Use use) noexcept {
 
 extern "C" {
 
-JNIEXPORT void JNICALL Java_com_quarnel_tesutil_tessel2_Tessel2MessageCatcher_outputInfoMessageN(
-    JNIEnv* env, jobject /*receiver*/, jstring text) {
+TESU_JNI_EXPORT void TESU_JNI_CALL
+Java_com_quarnel_tesutil_tessel2_Tessel2MessageCatcher_outputInfoMessageN(JNIEnv* env,
+                                                                          jobject /*receiver*/,
+                                                                          jstring text) {
     withJavaText(env, text, [](const char* bytes) {
         Port_MsgManData::createObject(kApplication, kSource, __LINE__, kRevision)
             .issueStatus(Port::StringBase<char>(bytes));
     });
 }
 
-JNIEXPORT void JNICALL Java_com_quarnel_tesutil_tessel2_Tessel2MessageCatcher_outputWarningMessageN(
-    JNIEnv* env, jobject /*receiver*/, jstring text) {
+TESU_JNI_EXPORT void TESU_JNI_CALL
+Java_com_quarnel_tesutil_tessel2_Tessel2MessageCatcher_outputWarningMessageN(JNIEnv* env,
+                                                                             jobject /*receiver*/,
+                                                                             jstring text) {
     withJavaText(env, text, [](const char* bytes) {
         Port_MsgManData::createObject(kApplication, kSource, __LINE__, kRevision)
             .issueWarning(Port::StringBase<char>(bytes));
     });
 }
 
-JNIEXPORT void JNICALL Java_com_quarnel_tesutil_tessel2_Tessel2MessageCatcher_outputErrorMessageN(
-    JNIEnv* env, jobject /*receiver*/, jstring text) {
+TESU_JNI_EXPORT void TESU_JNI_CALL
+Java_com_quarnel_tesutil_tessel2_Tessel2MessageCatcher_outputErrorMessageN(JNIEnv* env,
+                                                                           jobject /*receiver*/,
+                                                                           jstring text) {
     withJavaText(env, text, [](const char* bytes) {
         Port_MsgManData::createObject(kApplication, kSource, __LINE__, kRevision)
             .issueError(Port::StringBase<char>(bytes));
     });
 }
 
-JNIEXPORT void JNICALL Java_com_quarnel_tesutil_tessel2_Tessel2MessageCatcher_outputDebugMessageN(
-    JNIEnv* env, jobject /*receiver*/, jstring text) {
+TESU_JNI_EXPORT void TESU_JNI_CALL
+Java_com_quarnel_tesutil_tessel2_Tessel2MessageCatcher_outputDebugMessageN(JNIEnv* env,
+                                                                           jobject /*receiver*/,
+                                                                           jstring text) {
     withJavaText(env, text, [](const char* bytes) {
         // Looked up on every call: the registry is the one place that knows the logger.
         Tesu::DebugMessenger* logger =

@@ -18,20 +18,59 @@
 #ifndef TESU_TESSEL2MESSAGECATCHER_H
 #define TESU_TESSEL2MESSAGECATCHER_H
 
-#include <jni.h>
+// The JNI types the declarations use, declared here as the JDK's jni.h declares them, so that
+// this header needs no jni.h and a source may include both, in either order (in C, including
+// jni.h after this header needs C11, which allows a typedef to be repeated).
+#ifdef __cplusplus
+class _jobject;
+class _jstring;
+struct JNIEnv_;
+typedef _jobject* jobject;
+typedef _jstring* jstring;
+typedef JNIEnv_ JNIEnv;
+#elif !defined(_JAVASOFT_JNI_H_)
+struct _jobject;
+typedef struct _jobject* jobject;
+typedef jobject jstring;
+struct JNINativeInterface_;
+typedef const struct JNINativeInterface_* JNIEnv;
+#endif
+
+// JNI's calling convention (stdcall on Windows) and the export mark of the four functions.
+// The 32-bit DLL exports them through its module-definition file instead, under the names a
+// JVM looks up (TESU_JNI_EXPORTS_BY_DEF), so they carry no mark there.
+#if defined(_WIN32)
+#define TESU_JNI_CALL __stdcall
+#if defined(TESU_BUILDING_LIBRARY) && !defined(TESU_JNI_EXPORTS_BY_DEF)
+#define TESU_JNI_EXPORT __declspec(dllexport)
+#else
+#define TESU_JNI_EXPORT
+#endif
+#else
+#define TESU_JNI_CALL
+#define TESU_JNI_EXPORT __attribute__((visibility("default")))
+#endif
 
 #ifdef __cplusplus
 extern "C" {
 #endif
 
-JNIEXPORT void JNICALL Java_com_quarnel_tesutil_tessel2_Tessel2MessageCatcher_outputInfoMessageN(
-    JNIEnv* env, jobject receiver, jstring text);
-JNIEXPORT void JNICALL Java_com_quarnel_tesutil_tessel2_Tessel2MessageCatcher_outputWarningMessageN(
-    JNIEnv* env, jobject receiver, jstring text);
-JNIEXPORT void JNICALL Java_com_quarnel_tesutil_tessel2_Tessel2MessageCatcher_outputErrorMessageN(
-    JNIEnv* env, jobject receiver, jstring text);
-JNIEXPORT void JNICALL Java_com_quarnel_tesutil_tessel2_Tessel2MessageCatcher_outputDebugMessageN(
-    JNIEnv* env, jobject receiver, jstring text);
+TESU_JNI_EXPORT void TESU_JNI_CALL
+Java_com_quarnel_tesutil_tessel2_Tessel2MessageCatcher_outputInfoMessageN(JNIEnv* env,
+                                                                          jobject receiver,
+                                                                          jstring text);
+TESU_JNI_EXPORT void TESU_JNI_CALL
+Java_com_quarnel_tesutil_tessel2_Tessel2MessageCatcher_outputWarningMessageN(JNIEnv* env,
+                                                                             jobject receiver,
+                                                                             jstring text);
+TESU_JNI_EXPORT void TESU_JNI_CALL
+Java_com_quarnel_tesutil_tessel2_Tessel2MessageCatcher_outputErrorMessageN(JNIEnv* env,
+                                                                           jobject receiver,
+                                                                           jstring text);
+TESU_JNI_EXPORT void TESU_JNI_CALL
+Java_com_quarnel_tesutil_tessel2_Tessel2MessageCatcher_outputDebugMessageN(JNIEnv* env,
+                                                                           jobject receiver,
+                                                                           jstring text);
 
 #ifdef __cplusplus
 }

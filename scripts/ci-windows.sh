@@ -5,10 +5,13 @@
 # Build folders: build/windows-x86_64 and build/windows-i686 (override the parent with
 # TESU_WINDOWS_BUILD_ROOT). Each holds its own Wine prefix.
 #
-# The x86_64 build runs every unit test under wine64. The i686 build (the library's home
-# platform) needs wine32, which comes through Debian's multiarch and can fail to install when
-# a mirror is out of step; then the i686 library is still built and its exports checked, and
-# the job says that its tests did not run.
+# What the machine can run is decided by running it: for each width, a small Windows program is
+# built and started under that width's Wine loader (x86_64: /usr/lib/wine/wine64, i686:
+# /usr/lib/wine/wine; override with TESU_WINE64 and TESU_WINE32). When it runs, the build's
+# unit tests run under that loader, which the build also uses for test discovery. When it
+# does not (no wine32, or a kernel that cannot run 32-bit programs), the library and the tool
+# are still built and the exports checked, and one line says that the tests did not run and
+# why. The job fails only for a failed build, export check or test.
 set -euo pipefail
 cd "$(dirname "$0")/.."
 
@@ -40,12 +43,11 @@ if [ ${#missing[@]} -gt 0 ]; then
     "${missing[@]}" >/dev/null
 fi
 
-# wine32 through multiarch. When it cannot be had, the foreign architecture is taken away
-# again (if nothing of it got installed), so that later apt-get runs do not fail on its lists.
-have_wine32=no
-if installed wine32:i386; then
-  have_wine32=yes
-else
+# wine32 through multiarch, which the i686 tests need. Having it proves nothing (the kernel
+# may not run 32-bit programs): the probe below decides. When it cannot be had, the foreign
+# architecture is taken away again (if nothing of it got installed), so that later apt-get
+# runs do not fail on its lists.
+if ! installed wine32:i386; then
   echo "== Trying wine32 (i386 multiarch)"
   added_i386=no
   if ! dpkg --print-foreign-architectures | grep -qx i386; then
@@ -55,7 +57,7 @@ else
   $sudo_cmd apt-get update -qq >/dev/null 2>&1 || true
   if DEBIAN_FRONTEND=noninteractive $sudo_cmd apt-get install -y -qq --no-install-recommends \
        wine32:i386 >/tmp/tesu-wine32-install.log 2>&1; then
-    have_wine32=yes
+    echo "wine32 installed"
   else
     echo "wine32 could not be installed (last lines of apt-get):"
     tail -n 3 /tmp/tesu-wine32-install.log | sed 's/^/  /'
@@ -65,6 +67,60 @@ else
     fi
   fi
 fi
+
+# --- What runs here ----------------------------------------------------------------------
+loader_of() {
+  case $1 in
+    x86_64) echo "${TESU_WINE64:-/usr/lib/wine/wine64}" ;;
+    i686) echo "${TESU_WINE32:-/usr/lib/wine/wine}" ;;
+  esac
+}
+
+# probe ARCH: builds a Windows program of that width and runs it under the width's loader in
+# the build's Wine prefix (which the first run sets up). Sets probe_reason when it does not
+# run; returns 0 when it runs and prints what it should.
+probe_reason=""
+probe() {
+  local arch=$1
+  local build="$root/windows-$arch" loader
+  loader=$(loader_of "$arch")
+  mkdir -p "$build/probe"
+  local exe="$build/probe/probe.exe" log="$build/probe/run.log"
+  printf '#include <stdio.h>\nint main(void) { puts("probe runs"); return 0; }\n' \
+    >"$build/probe/probe.c"
+  "$arch-w64-mingw32-gcc-posix" -o "$exe" "$build/probe/probe.c"
+  export WINEDEBUG=-all
+  export WINEPREFIX
+  WINEPREFIX="$(cd "$build" && pwd)/wineprefix"
+  local status=0
+  # Through bash's exec, so that a loader the kernel cannot run says so ("Exec format error").
+  timeout 300 bash -c 'exec "$@"' probe "$loader" "$exe" >"$log" 2>&1 || status=$?
+  if [ $status -eq 0 ] && grep -q '^probe runs' "$log"; then
+    return 0
+  fi
+  local said
+  # What the loader said: its first line that names an error, else its last line.
+  said=$(grep -m 1 -iE 'error|cannot|not found' "$log" || grep -v '^[[:space:]]*$' "$log" |
+         tail -n 1 || true)
+  said=${said#probe: line 1: }
+  probe_reason="$loader exited with status $status${said:+: $said}"
+  [ $status -eq 124 ] && probe_reason="$loader did not finish within 300 s"
+  return 1
+}
+
+declare -A runs reason
+declare -A width=([x86_64]=64-bit [i686]=32-bit)
+for arch in x86_64 i686; do
+  if probe "$arch"; then
+    runs[$arch]=yes
+    echo "== Probe: a ${width[$arch]} Windows program runs under $(loader_of "$arch")"
+  else
+    runs[$arch]=no
+    reason[$arch]=$probe_reason
+    echo "== Probe: a ${width[$arch]} Windows program does not run ($probe_reason)"
+  fi
+  wineserver -k >/dev/null 2>&1 || true
+done
 
 # --- Export table ------------------------------------------------------------------------
 # The exported names of a DLL, one a line.
@@ -112,25 +168,20 @@ check_exports() {
 }
 
 # --- Builds ------------------------------------------------------------------------------
-# configure_and_build ARCH TESTS(ON|OFF) [targets...]
+# configure_and_build ARCH TESTS(ON|OFF) [targets...]: test discovery and CTest use the
+# width's loader, the one the probe ran.
 configure_and_build() {
   local arch=$1 tests=$2
   shift 2
-  local build="$root/windows-$arch"
+  local build="$root/windows-$arch" loader
+  loader=$(loader_of "$arch")
   mkdir -p "$build"
   export WINEDEBUG=-all
   export WINEPREFIX
   WINEPREFIX="$(cd "$build" && pwd)/wineprefix"
-  if [ "$tests" = ON ] && [ ! -f "$WINEPREFIX/system.reg" ]; then
-    # Test discovery runs the test programs at build time: Wine must be ready first.
-    local boot_start
-    boot_start=$(date +%s)
-    wineboot --init >/dev/null 2>&1 || true
-    wineserver -w
-    echo "Wine prefix $WINEPREFIX ready in $(elapsed "$boot_start")"
-  fi
   cmake -S . -B "$build" -G Ninja -DCMAKE_TOOLCHAIN_FILE="cmake/toolchain-mingw-$arch.cmake" \
-    -DCMAKE_BUILD_TYPE=RelWithDebInfo -DTESU_WERROR=ON -DTESU_BUILD_TESTS="$tests" >/dev/null
+    -DCMAKE_BUILD_TYPE=RelWithDebInfo -DTESU_WERROR=ON -DTESU_BUILD_TESTS="$tests" \
+    -DTESU_WINE_EXECUTABLE="$loader" -DCMAKE_CROSSCOMPILING_EMULATOR="$loader" >/dev/null
   if [ $# -gt 0 ]; then
     cmake --build "$build" -j "$jobs" --target "$@"
   else
@@ -186,39 +237,37 @@ run_tests() {
 }
 
 status=0
-
-echo "== Windows x86_64: build"
-step=$(date +%s)
-configure_and_build x86_64 ON
-echo "x86_64 build: $(elapsed "$step")"
-check_exports x86_64-w64-mingw32-objdump "$root/windows-x86_64/bin/libTesu_Utilities.dll" 64 ||
-  status=1
-
-echo "== Windows i686: build"
-step=$(date +%s)
-if [ "$have_wine32" = yes ]; then
-  configure_and_build i686 ON
-else
-  # Without wine32 the test programs cannot run, not even for discovery.
-  configure_and_build i686 OFF Tesu_Utilities tesutil
-fi
-echo "i686 build: $(elapsed "$step")"
-check_exports i686-w64-mingw32-objdump "$root/windows-i686/bin/libTesu_Utilities.dll" 32 ||
-  status=1
-
-echo "== Windows x86_64: unit tests under Wine"
-step=$(date +%s)
-run_tests x86_64 || status=1
-echo "x86_64 tests: $(elapsed "$step")"
-
-if [ "$have_wine32" = yes ]; then
-  echo "== Windows i686: unit tests under Wine"
+for arch in x86_64 i686; do
+  echo "== Windows $arch: build"
   step=$(date +%s)
-  run_tests i686 || status=1
-  echo "i686 tests: $(elapsed "$step")"
-else
-  echo "== Windows i686: unit tests NOT run (wine32 is not installed); library built, exports checked"
-fi
+  if [ "${runs[$arch]}" = yes ]; then
+    configure_and_build "$arch" ON
+  else
+    # The test programs cannot run here, not even for discovery at build time.
+    configure_and_build "$arch" OFF Tesu_Utilities tesutil
+  fi
+  echo "$arch build: $(elapsed "$step")"
+  bits=64
+  [ "$arch" = i686 ] && bits=32
+  check_exports "$arch-w64-mingw32-objdump" "$root/windows-$arch/bin/libTesu_Utilities.dll" \
+    "$bits" || status=1
+done
+
+not_run=()
+for arch in x86_64 i686; do
+  if [ "${runs[$arch]}" = yes ]; then
+    echo "== Windows $arch: unit tests under $(loader_of "$arch")"
+    step=$(date +%s)
+    run_tests "$arch" || status=1
+    echo "$arch tests: $(elapsed "$step")"
+  else
+    not_run+=("$arch")
+  fi
+done
+for arch in "${not_run[@]}"; do
+  echo "windows-$arch: unit tests NOT run: a ${width[$arch]} Windows program does not run on this" \
+    "machine (${reason[$arch]}); library and tool built, exports checked"
+done
 
 echo "Windows job: $(elapsed "$job_start"), status $status"
 exit $status

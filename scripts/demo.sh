@@ -1,6 +1,7 @@
 #!/usr/bin/env bash
-# Builds the library and the tool and runs the demonstration: a short tour of tesutil on the
-# sample installation (examples/installation), then the Java message demo.
+# Builds the library, the tool and the Java demo (not the tests and benchmarks), says which
+# CRC-32 backend CMake found, and runs the demonstration: a short tour of tesutil on the sample
+# installation (examples/installation), then the Java message demo.
 set -euo pipefail
 cd "$(dirname "$0")/.."
 
@@ -9,8 +10,27 @@ bash scripts/install-deps.sh
 jobs=$(nproc 2>/dev/null || echo 2)
 build=${TESU_BUILD_DIR:-build/default}
 
-cmake -S . -B "$build" -G Ninja -DCMAKE_BUILD_TYPE=RelWithDebInfo >/dev/null
-cmake --build "$build" -j "$jobs"
+echo "== Configuring ($build)"
+config_log=$(mktemp)
+cmake -S . -B "$build" -G Ninja -DCMAKE_BUILD_TYPE=RelWithDebInfo 2>&1 | tee "$config_log"
+echo
+echo "== The CRC-32 backend CMake found:"
+grep -iE '^-- .*CRC' "$config_log" || echo "(CMake did not say)"
+rm -f "$config_log"
+
+# Only what the demonstration runs: the library, the tool, and the Java demo when there is a
+# JDK (the tests and benchmarks are scripts/test.sh's business).
+targets=$(cmake --build "$build" --target help 2>/dev/null || true)
+demo_targets=(Tesu_Utilities tesutil)
+java_demo=no
+# (grep -q stopping early would break the pipe: the list of targets is taken whole first.)
+if grep -q '^java-demo:' <<<"$targets"; then
+  java_demo=yes
+  demo_targets+=(tesu_java tesu_java_demo TesuJavaHost)
+fi
+echo
+echo "== Building: ${demo_targets[*]}"
+cmake --build "$build" -j "$jobs" --target "${demo_targets[@]}"
 
 tesutil="$build/tools/tesutil"
 demo=examples/installation/designs/demo
@@ -56,9 +76,7 @@ run relpath examples/installation
 
 echo
 echo "== The Java message demo"
-# (The list of targets is taken whole first: grep -q stopping early would break the pipe.)
-targets=$(cmake --build "$build" --target help 2>/dev/null || true)
-if grep -q '^java-demo:' <<<"$targets"; then
+if [ "$java_demo" = yes ]; then
   cmake --build "$build" --target java-demo
 else
   echo "(not built: CMake found no JDK)"

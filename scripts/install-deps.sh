@@ -2,9 +2,9 @@
 # Installs the Debian packages the build needs when they are missing. Safe to run again.
 set -euo pipefail
 
-packages=(cmake ninja-build g++ clang libgtest-dev libgmock-dev libbenchmark-dev
-          libdeflate-dev zlib1g-dev openjdk-17-jdk-headless libcli11-dev help2man
-          bash-completion)
+packages=(cmake ninja-build g++ clang pkg-config libgtest-dev libgmock-dev libbenchmark-dev
+          libisal-dev libdeflate-dev zlib1g-dev libcli11-dev help2man bash-completion
+          openjdk-17-jdk-headless)
 missing=()
 for p in "${packages[@]}"; do
   dpkg-query -W -f='${Status}' "$p" 2>/dev/null | grep -q "install ok installed" || missing+=("$p")

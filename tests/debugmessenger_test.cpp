@@ -88,14 +88,15 @@ TEST_F(DebugMessengerTest, InheritsThroughGenerationsAndFollowsEachChange) {
     EXPECT_FALSE(root.IsOff());
 
     // A chain that ends without a level (a root set to inherit, a logger without parent)
-    // writes nothing instead of following a null parent.
+    // counts as off instead of following a null parent: only off-level lines are written.
     root.SetLevel(DebugMessenger::DEBUG_INHERIT);
     DebugMessenger orphan(nullptr, "orphan");
     EXPECT_TRUE(greatGrandchild.IsOff());
     EXPECT_TRUE(orphan.IsOff());
     greatGrandchild.Normal("n");
     orphan.Normal("n");
-    EXPECT_EQ(capture.text(), "");
+    orphan.Message(DebugMessenger::DEBUG_OFF, "off");
+    EXPECT_EQ(capture.text(), "DEBUG[orphan] - off\n");
     root.SetLevel(DebugMessenger::DEBUG_OFF);
 }
 

@@ -1,5 +1,7 @@
 #include "Tesu_Tessel2MessageCatcher.h"
 
+#include "Tesu_Jni.h"
+
 #include <gtest/gtest.h>
 #if defined(_WIN32)
 #include <windows.h>

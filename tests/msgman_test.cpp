@@ -66,23 +66,28 @@ std::string issueEveryType() {
     return all;
 }
 
+enum Failing { NEVER, ON_DEACTIVATE, ON_ACTIVATE };
+
 // A manager of our own that logs its activate/deactivate calls (with the number of managers
-// registered at that moment) and the messages it writes into a shared event list.
+// registered at that moment) and the messages it writes into a shared event list. It may be
+// made to throw from one of the two calls, as a host's own manager might.
 class RecordingManager : public Port_MsgMan {
   public:
-    RecordingManager(std::string name, std::vector<std::string>& events,
-                     bool failDeactivate = false)
-        : name_(std::move(name)), events_(events), failDeactivate_(failDeactivate) {
+    RecordingManager(std::string name, std::vector<std::string>& events, Failing failing = NEVER)
+        : name_(std::move(name)), events_(events), failing_(failing) {
         Port_MsgDispatcher::addMsgMan(this);
     }
     ~RecordingManager() override { Port_MsgDispatcher::removeMsgMan(this); }
     bool activate() override {
         note("activate");
+        if (failing_ == ON_ACTIVATE) {
+            throw std::runtime_error("activate failed");
+        }
         return Port_MsgMan::activate();
     }
     bool deactivate() override {
         note("deactivate");
-        if (failDeactivate_) {
+        if (failing_ == ON_DEACTIVATE) {
             throw std::runtime_error("deactivate failed");
         }
         return Port_MsgMan::deactivate();
@@ -99,7 +104,7 @@ class RecordingManager : public Port_MsgMan {
     }
     std::string name_;
     std::vector<std::string>& events_;
-    bool failDeactivate_;
+    Failing failing_;
 };
 
 }  // namespace
@@ -231,14 +236,41 @@ TEST(MsgMan, ThreeManagersAtOnceAndActivationOfAllOnDestruction) {
     m2.removeMsgStream(s2);
 }
 
-TEST(MsgMan, FailedConstructionActivatesWhatItDeactivatedAndRegistersNothing) {
+// G is already silenced by an older MsgMan; a failed construction must give back only what it
+// took: the older MsgMan's stream and X are active again, G stays silent while m1 lives.
+TEST(MsgMan, FailedConstructionRestoresOnlyWhatItDeactivatedAndRegistersNothing) {
     std::vector<std::string> events;
+    CerrCapture cerr;
     RecordingManager good("G", events);
-    RecordingManager bad("X", events, true);
+    std::ostringstream older;
+    Tesu::MsgMan m1(Tesu::MsgMan::DIAG_SILENT);
+    m1.addMsgStream(older);
+    RecordingManager bad("X", events, ON_DEACTIVATE);
+    events.clear();
     EXPECT_THROW(Tesu::MsgMan{}, std::runtime_error);
-    EXPECT_EQ(events, (std::vector<std::string>{"G.deactivate@2", "X.deactivate@2", "G.activate@2",
-                                                "X.activate@2"}));
-    EXPECT_EQ(Port_MsgDispatcher::getAllMsgMans().size(), 2u);
+    EXPECT_EQ(events,
+              (std::vector<std::string>{"G.deactivate@3", "X.deactivate@3", "X.activate@3"}));
+    EXPECT_EQ(Port_MsgDispatcher::getAllMsgMans().size(), 3u);
     issue(7, "still heard");
-    EXPECT_EQ(good.received, "still heard");
+    EXPECT_EQ(older.str(), "still heard\n");
+    EXPECT_EQ(bad.received, "still heard");
+    EXPECT_EQ(good.received, "");
+    m1.removeMsgStream(older);
+}
+
+// A manager whose activate throws must neither end the process nor keep the managers after it
+// silent; the departing MsgMan is unregistered all the same.
+TEST(MsgMan, DestructionActivatesTheRestWhenOneActivateThrows) {
+    std::vector<std::string> events;
+    CerrCapture cerr;
+    RecordingManager failing("F", events, ON_ACTIVATE);
+    RecordingManager good("G", events);
+    {
+        Tesu::MsgMan manager(Tesu::MsgMan::DIAG_SILENT);
+        events.clear();
+    }
+    EXPECT_EQ(events, (std::vector<std::string>{"F.activate@2", "G.activate@2"}));
+    EXPECT_EQ(Port_MsgDispatcher::getAllMsgMans().size(), 2u);
+    issue(7, "heard again");
+    EXPECT_EQ(good.received, "heard again");
 }

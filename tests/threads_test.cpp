@@ -22,6 +22,7 @@
 #include "TestSupport.h"
 #include "Tesu_DebugMessenger.h"
 #include "Tesu_IPUpdateInfo.h"
+#include "Tesu_Jni.h"
 #include "Tesu_Tessel2MessageCatcher.h"
 #include "Tesu_Utilities.h"
 

@@ -6,6 +6,7 @@
 
 #include <windows.h>
 
+#include "Tesu_Jni.h"
 #include "Tesu_Tessel2MessageCatcher.h"
 
 namespace {
