@@ -43,9 +43,11 @@ namespace {
 
 namespace fs = std::filesystem;
 
-const char kVersionText[] = "tesutil " TESUTIL_VERSION
-                            "\n"
-                            "There is NO WARRANTY, to the extent permitted by law.";
+const char kVersionText[] =
+    "tesutil " TESUTIL_VERSION
+    "\n"
+    "Copyright (c) 2026 The libTesu_Utilities developers.\n"
+    "MIT License: free to use, copy, change and pass on; there is NO WARRANTY.";
 
 struct GlobalOptions {
     std::string roots;

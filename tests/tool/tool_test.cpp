@@ -177,7 +177,9 @@ TEST(ToolHelp, VersionOptionNamesTheToolAndItsVersion) {
     EXPECT_EQ(run.status, 0);
     EXPECT_EQ(run.err, "");
     EXPECT_EQ(run.out, std::string("tesutil ") + TESU_PROJECT_VERSION +
-                           "\nThere is NO WARRANTY, to the extent permitted by law.\n");
+                           "\nCopyright (c) 2026 The libTesu_Utilities developers.\nMIT "
+                           "License: free to use, copy, change and pass on; there is NO "
+                           "WARRANTY.\n");
 }
 
 TEST(ToolOutput, AFailedWriteToStandardOutputEndsWithStatusOne) {
