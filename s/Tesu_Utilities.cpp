@@ -1,5 +1,6 @@
 #include "Tesu_Utilities.h"
 
+#include <algorithm>
 #include <cstdint>
 #include <cstring>
 #include <exception>
@@ -314,18 +315,21 @@ Port::StringBase<char> ChecksumText(std::uint32_t crc) {
 // The stored checksum text of a file, collected while its lines go by: the eight characters
 // that follow the first marker "# CRC:" and one skipped character, read from the file's
 // lines each followed by "\n". It may run over into later lines, and is shorter when the
-// file ends first.
+// file ends first. Also kept: where the marker stands and what follows it on its line.
 class StoredChecksum {
   public:
     // True once the marker has been seen.
     bool Found() const { return found_; }
-    // True while characters are still wanted from the lines after the marker's.
-    bool Wanted() const { return found_ && wanted_ > 0; }
-    // Looks for the marker in a line; when it is there, starts collecting from it.
-    void Search(const char* line, std::size_t length) {
+    // Looks for the marker in a line that starts at byte `offset` of the file; when it is
+    // there, starts collecting from it.
+    void Search(const char* line, std::size_t length, std::uint64_t offset) {
         const std::size_t marker = FindMarker(line, length);
         if (marker != Port::NPOS) {
             found_ = true;
+            offset_ = offset + marker;
+            const std::size_t fieldStart = marker + kMarkerLength;
+            const std::size_t fieldLength = std::min(length - fieldStart, kFieldLength);
+            field_.Append(line + fieldStart, fieldLength);
             skip_ = marker + kSkipAfterMarker;
             Collect(line, length);
         }
@@ -338,12 +342,16 @@ class StoredChecksum {
         }
     }
     const Port::StringBase<char>& Text() const { return text_; }
+    const Port::StringBase<char>& Field() const { return field_; }
+    std::uint64_t Offset() const { return offset_; }
 
   private:
     static constexpr char kMarker[] = "# CRC:";
     static constexpr std::size_t kMarkerLength = sizeof kMarker - 1;
     // The marker and the separator after it.
     static constexpr std::size_t kSkipAfterMarker = kMarkerLength + 1;
+    // The separator and the eight characters of the checksum.
+    static constexpr std::size_t kFieldLength = 9;
 
     static std::size_t FindMarker(const char* line, std::size_t length) {
         std::size_t at = 0;
@@ -373,23 +381,25 @@ class StoredChecksum {
     }
 
     bool found_ = false;
+    std::uint64_t offset_ = 0;
     std::size_t skip_ = 0;
     std::size_t wanted_ = 8;
     Port::StringBase<char> text_;
+    Port::StringBase<char> field_;
 };
 
 // Follows a checksummed file line by line: the CRC-32 of the lines without "#", joined, and
 // the stored checksum text. Data lines are gathered into a bounded batch so that the CRC runs
 // over long stretches instead of line by line; a line as long as a batch goes to the CRC by
 // itself, so memory stays bounded.
-class ChecksumScan {
+class LineScan {
   public:
-    ChecksumScan() : batch_(kBatchBytes) {}
-    ChecksumScan(const ChecksumScan&) = delete;
-    ChecksumScan& operator=(const ChecksumScan&) = delete;
+    LineScan() : batch_(kBatchBytes) {}
+    LineScan(const LineScan&) = delete;
+    LineScan& operator=(const LineScan&) = delete;
 
-    // The next line of the file, without its line break.
-    void Add(const char* line, std::size_t length) {
+    // The next line of the file, without its line break; it starts at byte `offset`.
+    void Add(const char* line, std::size_t length, std::uint64_t offset) {
         const bool dataLine = std::memchr(line, '#', length) == nullptr;
         if (dataLine) {
             if (length > kBatchBytes - used_) {
@@ -405,7 +415,7 @@ class ChecksumScan {
         if (stored_.Found()) {
             stored_.Collect(line, length);
         } else if (!dataLine) {
-            stored_.Search(line, length);
+            stored_.Search(line, length, offset);
         }
     }
     // After the last line: the CRC of the data lines.
@@ -433,11 +443,16 @@ class ChecksumScan {
 // (at "\n", the "\r" of a "\r\n" end dropped, a last line without a line break kept as it
 // is, no line after a final line break), but a block at a time: a line that lies whole in a
 // block is handed over in place, without a copy; only a line that runs over the end of a block
-// is gathered in `carry`.
-void ScanLines(Port::Stream& stream, ChecksumScan& scan) {
+// is gathered in `carry`. Returns how the first line ends ("\n", "\r\n", or "" when no line
+// break comes).
+const char* ScanLines(Port::Stream& stream, LineScan& scan) {
+    const char* firstBreak = "";
     std::string carry;
+    std::uint64_t blockStart = 0;  // offset of the current block in the file
+    std::uint64_t lineStart = 0;   // offset of the line being read
     const char* block = nullptr;
-    for (std::size_t size = stream.readblock(block); size > 0; size = stream.readblock(block)) {
+    for (std::size_t size = stream.readblock(block); size > 0;
+         blockStart += size, size = stream.readblock(block)) {
         const char* next = block;
         const char* const end = block + size;
         while (next < end) {
@@ -447,26 +462,75 @@ void ScanLines(Port::Stream& stream, ChecksumScan& scan) {
                 carry.append(next, static_cast<std::size_t>(end - next));
                 break;
             }
+            bool crlf = false;
             if (carry.empty()) {
                 const char* lineEnd = lineBreak;
                 if (lineEnd > next && lineEnd[-1] == '\r') {
                     --lineEnd;
+                    crlf = true;
                 }
-                scan.Add(next, static_cast<std::size_t>(lineEnd - next));
+                scan.Add(next, static_cast<std::size_t>(lineEnd - next), lineStart);
             } else {
                 carry.append(next, static_cast<std::size_t>(lineBreak - next));
                 if (carry.back() == '\r') {
                     carry.pop_back();
+                    crlf = true;
                 }
-                scan.Add(carry.data(), carry.size());
+                scan.Add(carry.data(), carry.size(), lineStart);
                 carry.clear();
             }
+            if (*firstBreak == '\0') {
+                firstBreak = crlf ? "\r\n" : "\n";
+            }
             next = lineBreak + 1;
+            lineStart = blockStart + static_cast<std::uint64_t>(next - block);
         }
     }
     if (!carry.empty()) {
-        scan.Add(carry.data(), carry.size());
+        scan.Add(carry.data(), carry.size(), lineStart);
     }
+    return firstBreak;
+}
+
+// Reads the rest of `stream` into `result`. The CRC and the stored text say nothing yet of
+// the file's verdict when a read failed; the caller decides what that means.
+void ScanStream(Port::Stream& stream, ChecksumScan& result) {
+    LineScan scan;
+    result.firstLineBreak = ScanLines(stream, scan);
+    result.crc = scan.Finish();
+    result.checksum = ChecksumText(result.crc);
+    const StoredChecksum& stored = scan.Stored();
+    result.marked = stored.Found();
+    result.markerOffset = stored.Offset();
+    result.markerField = stored.Field();
+    result.stored = stored.Text();
+    result.valid =
+        !stored.Found() || stored.Text().Compare(result.checksum, Port::COMPARE_NOCASE) == 0;
+    result.reason = stream.error();
+}
+
+// How a scan of a named file ended.
+enum class ScanEnd { READ, NOT_OPENED, READ_FAILED, CLOSE_FAILED };
+
+// Opens, scans and closes `fileName`, with `result.reason` set unless it was READ.
+ScanEnd ScanFile(const Port::StringBase<char>& fileName, ChecksumScan& result) {
+    result = ChecksumScan();
+    Port::Stream* stream = Port::File::open(fileName, Port::File::READ, true);
+    if (stream == nullptr) {
+        result.reason = Port::File::lastError();
+        return ScanEnd::NOT_OPENED;
+    }
+    StreamCloser closer(stream);
+    // One pass over the lines; only a bounded batch of them is held at any time.
+    ScanStream(*stream, result);
+    const bool readFailed = !result.reason.IsEmpty();
+    if (!closer.close()) {
+        if (!readFailed) {
+            result.reason = Port::File::lastError();
+        }
+        return ScanEnd::CLOSE_FAILED;
+    }
+    return readFailed ? ScanEnd::READ_FAILED : ScanEnd::READ;
 }
 
 }  // namespace
@@ -486,30 +550,43 @@ unsigned int Utilities::CalculateChecksum(const Port::StringBase<char>& text,
 
 unsigned int Utilities::ValidateFileChecksum(const Port::StringBase<char>& fileName,
                                              bool& verdict) {
-    verdict = true;
-    Port::Stream* stream = Port::File::open(fileName, Port::File::READ, true);
-    if (stream == nullptr) {
-        messageSource(__LINE__).issueError("Could not open %s\n", fileName.GetText());
-        verdict = false;
-        return 1;
-    }
-    StreamCloser closer(stream);
-
-    // One pass over the lines; only a bounded batch of them is held at any time.
     ChecksumScan scan;
-    ScanLines(*stream, scan);
-    const std::uint32_t crc = scan.Finish();
-
-    if (!closer.close()) {
-        messageSource(__LINE__).issueError("Could not close %s\n", fileName.GetText());
-        verdict = false;
-        return 1;
+    switch (ScanFile(fileName, scan)) {
+        case ScanEnd::NOT_OPENED:
+            messageSource(__LINE__).issueError("Could not open %s\n", fileName.GetText());
+            verdict = false;
+            return 1;
+        case ScanEnd::CLOSE_FAILED:
+            messageSource(__LINE__).issueError("Could not close %s\n", fileName.GetText());
+            verdict = false;
+            return 1;
+        case ScanEnd::READ:
+        case ScanEnd::READ_FAILED:
+            // A read error ends the lines as the end of the file does.
+            break;
     }
-    const StoredChecksum& stored = scan.Stored();
-    if (stored.Found() && stored.Text().Compare(ChecksumText(crc), Port::COMPARE_NOCASE) != 0) {
-        verdict = false;
-    }
+    verdict = scan.valid;
     return 0;
+}
+
+unsigned int Utilities::ScanChecksummedFile(const Port::StringBase<char>& fileName,
+                                            ChecksumScan& scan) {
+    switch (ScanFile(fileName, scan)) {
+        case ScanEnd::READ:
+            return 0;
+        case ScanEnd::NOT_OPENED:
+            return 1;
+        case ScanEnd::READ_FAILED:
+        case ScanEnd::CLOSE_FAILED:
+            break;
+    }
+    return 2;
+}
+
+unsigned int Utilities::ScanChecksummedStream(Port::Stream& stream, ChecksumScan& scan) {
+    scan = ChecksumScan();
+    ScanStream(stream, scan);
+    return scan.reason.IsEmpty() ? 0 : 2;
 }
 
 // ==== File lists =============================================================================

@@ -4,13 +4,43 @@
 #ifndef TESU_UTILITIES_H
 #define TESU_UTILITIES_H
 
+#include <cstdint>
 #include <vector>
 
 #include "Port_FileName.h"
 #include "Port_String.h"
 #include "Tesu_Export.h"
 
+namespace Port {
+class Stream;
+}
+
 namespace Tesu {
+
+// What one pass over a checksummed file found: everything ValidateFileChecksum decides on,
+// and where the checksum line stands, for a writer that is to set it. Filled by
+// Utilities::ScanChecksummedFile and ScanChecksummedStream; owned by the caller.
+struct ChecksumScan {
+    // CRC-32 of the lines that hold no "#", joined, and its eight-character text (what
+    // CalculateChecksum gives for the same lines).
+    std::uint32_t crc = 0;
+    Port::StringBase<char> checksum;
+    // True when the file holds "# CRC:"; then `markerOffset` is the byte offset of the first
+    // marker's "#" in the file, and `markerField` holds the characters that follow the marker
+    // on its line, at most nine (the skipped character and the eight of the checksum), without
+    // the line break or the "\r" of a CR-LF end.
+    bool marked = false;
+    std::uint64_t markerOffset = 0;
+    Port::StringBase<char> markerField;
+    // The stored checksum text as ValidateFileChecksum reads it (run on across line breaks,
+    // shorter when the file ends first), and ValidateFileChecksum's verdict on the content.
+    Port::StringBase<char> stored;
+    bool valid = true;
+    // How the file's first line ends: "\n", "\r\n", or empty when the file holds no "\n".
+    Port::StringBase<char> firstLineBreak;
+    // The system's reason when the scan did not succeed ("No such file or directory").
+    Port::StringBase<char> reason;
+};
 
 class TESU_API Utilities {
   public:
@@ -98,6 +128,16 @@ class TESU_API Utilities {
     // file as passed. The file is read in one pass; memory use is bounded by its longest
     // line, not by its size.
     static unsigned int ValidateFileChecksum(const Port::StringBase<char>& fileName, bool& verdict);
+    // Reads the file `fileName` as ValidateFileChecksum does and fills `scan` (every field set
+    // anew), issuing no message; memory use is bounded as there. Returns 0 when the file was
+    // read and closed; 1 when it could not be opened; 2 when a read or the close failed (the
+    // fields then describe the bytes read before the failure). `scan.reason` says why for 1
+    // and 2 and is empty for 0.
+    static unsigned int ScanChecksummedFile(const Port::StringBase<char>& fileName,
+                                            ChecksumScan& scan);
+    // The same over the rest of an open stream (standard input, say), which stays open and
+    // stays the caller's. Returns 0, or 2 when a read failed (`scan.reason` says why).
+    static unsigned int ScanChecksummedStream(Port::Stream& stream, ChecksumScan& scan);
 
     // ---- File lists ----------------------------------------------------------------------
     // A file list names one member per line, relative to the list's directory; "#" starts a

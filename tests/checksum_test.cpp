@@ -2,10 +2,13 @@
 // their own "# CRC:" line.
 #include <gtest/gtest.h>
 
+#include <cerrno>
+#include <cstring>
 #include <filesystem>
 #include <string>
 #include <vector>
 
+#include "Port_File.h"
 #include "Port_String.h"
 #include "TestPlatform.h"
 #include "TestSupport.h"
@@ -38,6 +41,13 @@ Outcome Validate(const std::string& path) {
             Utilities::ValidateFileChecksum(Port::StringBase<char>(path), verdict);
         if (initial) {
             outcome = Outcome{result, verdict, capture.text()};
+            // The silent scan reads the file the same way and says nothing.
+            Tesu::ChecksumScan scan;
+            EXPECT_EQ(result, Utilities::ScanChecksummedFile(Port::StringBase<char>(path), scan))
+                << path;
+            EXPECT_EQ(result == 0 && verdict, scan.valid && result == 0) << path;
+            EXPECT_EQ(result != 0, !scan.reason.IsEmpty()) << path;
+            EXPECT_EQ(outcome.messages, capture.text()) << path;
         } else {
             EXPECT_EQ(outcome.result, result) << path;
             EXPECT_EQ(outcome.verdict, verdict) << path;
@@ -276,6 +286,91 @@ TEST(ValidateFileChecksum, NamesThatDoNotOpenAreReportedAsPassed) {
     EXPECT_EQ("ERROR:tesutil - Could not open \n", outcome.messages);
 }
 
+// The scan tells a writer where the checksum line is and how the file's lines end; its CRC
+// and verdict are those of CalculateChecksum and ValidateFileChecksum.
+TEST(ScanChecksummedFile, TellsWhereTheChecksumLineStandsAndHowLinesEnd) {
+    struct Case {
+        std::string content;
+        bool marked;
+        std::uint64_t offset;
+        std::string field;
+        std::string stored;
+        std::string lineBreak;
+    };
+    const std::string sum = Sum(kBody);
+    const std::string longLine(300 * 1024, 'x');
+    const Case cases[] = {
+        {kBody, false, 0, "", "", "\n"},
+        {"", false, 0, "", "", ""},
+        {"no break", false, 0, "", "", ""},
+        {"# CRC: " + sum + "\n" + kBody, true, 0, " " + sum, sum, "\n"},
+        {"a\r\nb # CRC: 1234abcd tail\r\n", true, 5, " 1234abcd", "1234abcd", "\r\n"},
+        // The rest of a short checksum line, without its CR-LF; the value runs on below.
+        {"x\n# CRC:ab\r\ncd\n", true, 2, "ab", "b\ncd\n", "\n"},
+        {"# CRC:", true, 0, "", "", ""},
+        // Only the first marker counts, also after a line longer than the reader's blocks.
+        {longLine + "\n# CRC: 1\n# CRC: 2\n", true, longLine.size() + 1, " 1", "1\n# CRC:", "\n"},
+        {"#" + longLine + "# CRC:\r", true, longLine.size() + 1, "\r", "\n", ""},
+    };
+    tesutest::TempDir dir;
+    for (const Case& c : cases) {
+        const std::string what = c.content.substr(0, 40);
+        const std::string path = dir.write("scanned.txt", c.content);
+        Tesu::ChecksumScan scan;
+        scan.reason = "stale";
+        ASSERT_EQ(0u, Utilities::ScanChecksummedFile(Port::StringBase<char>(path), scan)) << what;
+        EXPECT_EQ(c.marked, scan.marked) << what;
+        EXPECT_EQ(c.offset, scan.markerOffset) << what;
+        EXPECT_EQ(c.field, scan.markerField.str()) << what;
+        EXPECT_EQ(c.stored, scan.stored.str()) << what;
+        EXPECT_EQ(c.lineBreak, scan.firstLineBreak.str()) << what;
+        EXPECT_EQ("", scan.reason.str()) << what;
+        std::string data;    // the lines, each ended by "\n"
+        std::string joined;  // the lines without "#", joined
+        for (std::size_t at = 0; at < c.content.size();) {
+            std::size_t end = c.content.find('\n', at);
+            end = end == std::string::npos ? c.content.size() : end;
+            std::string line = c.content.substr(at, end - at);
+            if (end < c.content.size() && !line.empty() && line.back() == '\r') {
+                line.pop_back();
+            }
+            data += line + "\n";
+            joined += line.find('#') == std::string::npos ? line : "";
+            at = end + 1;
+        }
+        EXPECT_EQ(Sum(data), scan.checksum.str()) << what;
+        EXPECT_EQ(Port::StringBase<char>(joined).CRC32(), scan.crc) << what;
+        bool verdict = false;
+        Utilities::ValidateFileChecksum(Port::StringBase<char>(path), verdict);
+        EXPECT_EQ(verdict, scan.valid) << what;
+
+        // The same content through an open stream, which the scan leaves open.
+        Port::Stream* stream =
+            Port::File::open(Port::StringBase<char>(path), Port::File::READ, true);
+        ASSERT_NE(nullptr, stream);
+        Tesu::ChecksumScan streamed;
+        EXPECT_EQ(0u, Utilities::ScanChecksummedStream(*stream, streamed)) << what;
+        EXPECT_EQ(scan.crc, streamed.crc) << what;
+        EXPECT_EQ(scan.markerOffset, streamed.markerOffset) << what;
+        EXPECT_EQ(scan.stored, streamed.stored) << what;
+        EXPECT_TRUE(Port::File::close(stream));
+    }
+}
+
+TEST(ScanChecksummedFile, GivesTheSystemsReasonForAFileThatDoesNotOpen) {
+    tesutest::TempDir dir;
+    tesutest::MessageCapture capture;
+    Tesu::ChecksumScan scan;
+    scan.marked = true;
+    EXPECT_EQ(1u,
+              Utilities::ScanChecksummedFile(Port::StringBase<char>(dir.join("missing")), scan));
+    EXPECT_EQ(std::strerror(ENOENT), scan.reason.str());
+    EXPECT_FALSE(scan.marked);
+    EXPECT_EQ(1u, Utilities::ScanChecksummedFile(Port::StringBase<char>(dir.mkdir("d")), scan));
+    EXPECT_EQ(std::strerror(EISDIR), scan.reason.str());
+    EXPECT_EQ("", capture.text());
+}
+
 TEST(ValidateFileChecksum, UnreadableFileDoesNotOpen) {
     if (const char* reason = tesutest::WhyPermissionsDoNotLockOut()) {
         GTEST_SKIP() << reason;
@@ -287,6 +382,9 @@ TEST(ValidateFileChecksum, UnreadableFileDoesNotOpen) {
     EXPECT_EQ(1u, outcome.result);
     EXPECT_FALSE(outcome.verdict);
     EXPECT_EQ("ERROR:tesutil - Could not open " + path + "\n", outcome.messages);
+    Tesu::ChecksumScan scan;
+    EXPECT_EQ(1u, Utilities::ScanChecksummedFile(Port::StringBase<char>(path), scan));
+    EXPECT_EQ(std::strerror(EACCES), scan.reason.str());
 }
 
 }  // namespace

@@ -1,6 +1,13 @@
 // Port::File, Port::Stream and UT_DIR on real files in a temporary directory.
 #include <gtest/gtest.h>
+#ifndef _WIN32
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+#endif
 
+#include <cerrno>
+#include <cstring>
 #include <filesystem>
 #include <random>
 #include <stdexcept>
@@ -124,6 +131,12 @@ TEST(PortStream, ReadErrorsEndReading) {
     Port::StringBase<char> line("kept?");
     EXPECT_EQ(failing->readline(line), -1);
     EXPECT_TRUE(line.IsEmpty());
+    // The system's reason is kept (under Wine the runtime reports it as an invalid argument).
+#ifdef _WIN32
+    EXPECT_NE(failing->error().str(), "");
+#else
+    EXPECT_EQ(failing->error().str(), std::strerror(EIO));
+#endif
     EXPECT_TRUE(File::close(failing));
 }
 
@@ -203,37 +216,72 @@ TEST(PortStream, ReadblockLendsEveryByteOnce) {
     EXPECT_TRUE(File::close(writer));
 }
 
+// Each refusal leaves the system's reason for it.
 TEST(PortFile, OpenRefusesWhatCannotBeRead) {
     tesutest::TempDir tmp;
     const std::string file = tmp.write("f.txt", "x\n");
-    EXPECT_EQ(File::open(tmp.path().c_str(), File::READ, true), nullptr);
-    EXPECT_EQ(File::open(tmp.mkdir("sub").c_str(), File::READ, false), nullptr);
-    EXPECT_EQ(File::open(tmp.path().c_str(), File::WRITE, true), nullptr);
-    EXPECT_EQ(File::open(tmp.join("missing").c_str(), File::READ, true), nullptr);
-    EXPECT_EQ(File::open(tmp.join("no/such/dir/new").c_str(), File::WRITE, true), nullptr);
+    auto expectRefused = [](const Port::StringBase<char>& name, int access, int code) {
+        EXPECT_EQ(File::open(name, access, true), nullptr) << name.str() << ' ' << access;
+        EXPECT_EQ(File::lastError().str(), std::strerror(code)) << name.str() << ' ' << access;
+    };
+    expectRefused(tmp.path().c_str(), File::READ, EISDIR);
+    expectRefused(tmp.mkdir("sub").c_str(), File::READ, EISDIR);
+    expectRefused(tmp.path().c_str(), File::WRITE, EISDIR);
+    expectRefused(tmp.join("missing").c_str(), File::READ, ENOENT);
+    expectRefused(tmp.join("no/such/dir/new").c_str(), File::WRITE, ENOENT);
     EXPECT_EQ(File::open("", File::READ, true), nullptr);
     for (const int access : {0, 4, -1, 100}) {
-        EXPECT_EQ(File::open(file.c_str(), access, true), nullptr) << access;
+        expectRefused(file.c_str(), access, EINVAL);
     }
     // A NUL byte would hide the rest of the name from the system.
-    EXPECT_EQ(
-        File::open(Port::StringBase<char>((file + std::string("\0x", 2)).c_str(), file.size() + 2),
-                   File::READ, true),
-        nullptr);
+    expectRefused(Port::StringBase<char>((file + std::string("\0x", 2)).c_str(), file.size() + 2),
+                  File::READ, EINVAL);
     EXPECT_FALSE(File::close(nullptr));
+    EXPECT_EQ(File::lastError().str(), std::strerror(EINVAL));
 #ifndef _WIN32
     // Neither a FIFO without a writer (which would block the open for good) nor an endless
     // device is read as a file; writing to a device still works.
     const std::string fifo = tmp.join("fifo");
     ASSERT_EQ(::mkfifo(fifo.c_str(), 0600), 0);
     EXPECT_EQ(File::open(fifo.c_str(), File::READ, true), nullptr);
+    EXPECT_EQ(File::lastError().str(), "Not a regular file");
     EXPECT_EQ(File::open("/dev/zero", File::READ, true), nullptr);
+    EXPECT_EQ(File::lastError().str(), "Not a regular file");
     Stream* devNull = File::open("/dev/null", File::WRITE, true);
     ASSERT_NE(devNull, nullptr);
     EXPECT_TRUE(devNull->write("x\n", 2));
     EXPECT_TRUE(File::close(devNull));
 #endif
 }
+
+#ifndef _WIN32
+// Standard input is read through a duplicate: closing the stream leaves descriptor 0 open.
+TEST(PortFile, StandardInputIsReadThroughADuplicate) {
+    tesutest::TempDir tmp;
+    const std::string input = tmp.write("in.txt", "one\r\ntwo");
+    const int saved = ::dup(0);
+    ASSERT_GE(saved, 0);
+    const int file = ::open(input.c_str(), O_RDONLY);
+    ASSERT_GE(file, 0);
+    ASSERT_EQ(::dup2(file, 0), 0);
+    ::close(file);
+    Stream* in = File::openStandardInput();
+    ASSERT_NE(in, nullptr);
+    EXPECT_EQ(in->name().str(), "-");
+    Port::StringBase<char> line;
+    EXPECT_EQ(in->readline(line), 3);
+    EXPECT_EQ(in->readline(line), 3);
+    EXPECT_EQ(line.str(), "two");
+    EXPECT_TRUE(in->geteof());
+    EXPECT_TRUE(File::close(in));
+    EXPECT_NE(::fcntl(0, F_GETFD), -1);
+    ::close(0);
+    EXPECT_EQ(File::openStandardInput(), nullptr);
+    EXPECT_EQ(File::lastError().str(), std::strerror(EBADF));
+    ASSERT_EQ(::dup2(saved, 0), 0);
+    ::close(saved);
+}
+#endif
 
 TEST(PortFile, WriteAppendAndReadBack) {
     tesutest::TempDir tmp;
@@ -289,12 +337,15 @@ TEST(PortFile, WriteFailuresAreReported) {
     Stream* full = File::open("/dev/full", File::WRITE, true);
     ASSERT_NE(full, nullptr);
     EXPECT_TRUE(full->write("buffered", 8));
+    EXPECT_EQ(full->error().str(), "");
     EXPECT_FALSE(File::close(full));
+    EXPECT_EQ(File::lastError().str(), std::strerror(ENOSPC));
 
     Stream* flushed = File::open("/dev/full", File::WRITE, true);
     ASSERT_NE(flushed, nullptr);
     EXPECT_TRUE(flushed->write("buffered", 8));
     EXPECT_FALSE(flushed->flush());
+    EXPECT_EQ(flushed->error().str(), std::strerror(ENOSPC));
     EXPECT_FALSE(flushed->write("more", 4));
     EXPECT_FALSE(File::close(flushed));
 }

@@ -48,8 +48,12 @@ class PORT_API Stream {
     bool flush();
     // True when the stream was opened for writing or appending.
     bool writable() const;
-    // The name the stream was opened with.
+    // The name the stream was opened with ("-" for standard input).
     const StringBase<char>& name() const;
+    // Why the first failed read or write of this stream failed, in the system's words ("Input/
+    // output error", "No space left on device"); empty while none has failed. A read error ends
+    // reading just as the end of the file does; this tells the two apart.
+    StringBase<char> error() const;
 
   private:
     friend class File;
@@ -78,9 +82,20 @@ class PORT_API File {
     // always gives the bytes as stored (a Ctrl-Z byte does not end a file), so lines read either
     // way are the same, since readline drops the "\r" of "\r\n".
     static Stream* open(const StringBase<char>& name, int access, bool binary);
+    // A stream for reading the process's standard input, over a duplicate of its descriptor
+    // (so close leaves standard input itself open), whatever it is: a file, a pipe, a terminal.
+    // Bytes come as sent (binary on Windows). Its name is "-". Null when standard input is
+    // closed or is a directory. The caller releases it with close.
+    static Stream* openStandardInput();
     // Writes out and closes the stream, and frees it in every case. Returns false when
     // writing out or closing failed, or when `stream` is null.
     static bool close(Stream* stream);
+    // Why the last failed open, openStandardInput or close of the calling thread failed, in the
+    // system's words: "No such file or directory", "Permission denied", "Is a directory",
+    // "Not a regular file" (a FIFO or a device opened for reading), "Invalid argument" (an
+    // unknown access value, a name holding a NUL byte or, on Windows, invalid UTF-8). The text
+    // stays until the next failure of the thread; successful calls leave it as it is.
+    static StringBase<char> lastError();
 
     // True for an existing file or directory (symbolic links followed).
     static bool exist(const StringBase<char>& name);

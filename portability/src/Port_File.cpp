@@ -2,6 +2,7 @@
 #include "Port_File.h"
 
 #include <algorithm>
+#include <cerrno>
 #include <cstring>
 #include <stdexcept>
 #include <string>
@@ -34,6 +35,21 @@ bool systemName(const StringBase<char>& name, std::string& result) {
         }
     }
     return true;
+}
+
+// The reason of the last failed open or close of this thread.
+thread_local StringBase<char> lastFailure;
+
+// The system's text for an error code.
+StringBase<char> systemReason(int code) {
+    return StringBase<char>(std::strerror(code));
+}
+
+// Records why an operation failed and answers what it is to return.
+template <typename Result>
+Result failWith(StringBase<char> reason, Result result) {
+    lastFailure = std::move(reason);
+    return result;
 }
 
 os::Kind kindOf(const StringBase<char>& name) {
@@ -71,7 +87,9 @@ struct Stream::Impl {
             return true;
         }
         atEnd = true;
-        failed = count < 0;
+        if (count < 0) {
+            fail(errno);
+        }
         return false;
     }
 
@@ -85,15 +103,24 @@ struct Stream::Impl {
             const bool ok = os::writeFile(handle, buffer.get(), end);
             end = 0;
             if (!ok) {
-                failed = true;
+                fail(errno);
                 return false;
             }
         }
         return true;
     }
 
+    // Marks the stream failed; the first failure's reason is kept.
+    void fail(int code) {
+        if (!failed) {
+            failed = true;
+            reason = systemReason(code);
+        }
+    }
+
     os::Handle handle;
     StringBase<char> name;
+    StringBase<char> reason;  // why the first read or write failed
     bool writable;
     std::unique_ptr<char[]> buffer;
     std::size_t capacity;
@@ -184,7 +211,7 @@ bool Stream::write(const char* data, std::size_t length) {
     if (length >= s.capacity) {
         // Larger than the buffer: straight to the file, after what was buffered before it.
         if (!os::writeFile(s.handle, data, length)) {
-            s.failed = true;
+            s.fail(errno);
             return false;
         }
         return true;
@@ -207,6 +234,10 @@ const StringBase<char>& Stream::name() const {
     return impl_->name;
 }
 
+StringBase<char> Stream::error() const {
+    return impl_->reason;
+}
+
 Stream* File::open(const StringBase<char>& name, int access, bool binary) {
     os::OpenMode mode;
     switch (access) {
@@ -220,15 +251,18 @@ Stream* File::open(const StringBase<char>& name, int access, bool binary) {
             mode = os::OpenMode::APPEND;
             break;
         default:
-            return nullptr;
+            return failWith<Stream*>(systemReason(EINVAL), nullptr);
     }
     std::string native;
     if (!systemName(name, native)) {
-        return nullptr;
+        return failWith<Stream*>(systemReason(EINVAL), nullptr);
     }
     const os::Handle handle = os::openFile(native, mode, binary);
     if (handle == os::INVALID_HANDLE) {
-        return nullptr;
+        // Windows refuses to open a directory with "Permission denied"; say what it is.
+        const int code = errno;
+        const bool directory = code == EACCES && os::nameKind(native) == os::Kind::DIRECTORY;
+        return failWith<Stream*>(systemReason(directory ? EISDIR : code), nullptr);
     }
     // Some systems open a directory for reading; it has no bytes to give as lines. Nor is
     // anything else but a regular file read: a FIFO or a device may never end (/dev/zero is
@@ -236,7 +270,10 @@ Stream* File::open(const StringBase<char>& name, int access, bool binary) {
     const os::Kind kind = os::handleKind(handle);
     if (kind == os::Kind::DIRECTORY || (mode == os::OpenMode::READ && kind != os::Kind::FILE)) {
         os::closeFile(handle);
-        return nullptr;
+        return failWith<Stream*>(kind == os::Kind::DIRECTORY
+                                     ? systemReason(EISDIR)
+                                     : StringBase<char>("Not a regular file"),
+                                 nullptr);
     }
     std::size_t size = kWriteBufferSize;
     if (mode == os::OpenMode::READ) {
@@ -252,15 +289,40 @@ Stream* File::open(const StringBase<char>& name, int access, bool binary) {
     return new Stream(std::move(impl));
 }
 
+Stream* File::openStandardInput() {
+    const os::Handle handle = os::duplicateStandardInput();
+    if (handle == os::INVALID_HANDLE) {
+        return failWith<Stream*>(systemReason(errno), nullptr);
+    }
+    // A pipe or a terminal is what standard input usually is; only a directory has no bytes.
+    if (os::handleKind(handle) == os::Kind::DIRECTORY) {
+        os::closeFile(handle);
+        return failWith<Stream*>(systemReason(EISDIR), nullptr);
+    }
+    std::unique_ptr<Stream::Impl> impl(
+        new Stream::Impl(handle, StringBase<char>("-"), false, kReadBufferSize));
+    return new Stream(std::move(impl));
+}
+
+StringBase<char> File::lastError() {
+    return lastFailure;
+}
+
 bool File::close(Stream* stream) {
     if (stream == nullptr) {
-        return false;
+        return failWith(systemReason(EINVAL), false);
     }
     Stream::Impl& s = *stream->impl_;
     bool ok = !s.writable || s.writeOut();
     const os::Handle handle = s.handle;
     s.handle = os::INVALID_HANDLE;
-    ok = os::closeFile(handle) && ok;
+    if (!os::closeFile(handle) && ok) {
+        s.fail(errno);
+        ok = false;
+    }
+    if (!ok) {
+        lastFailure = s.reason;
+    }
     delete stream;
     return ok;
 }

@@ -103,6 +103,11 @@ bool closeFile(Handle handle) {
     return ::close(fd(handle)) == 0;
 }
 
+Handle duplicateStandardInput() {
+    const int result = ::fcntl(STDIN_FILENO, F_DUPFD_CLOEXEC, 0);
+    return result < 0 ? INVALID_HANDLE : static_cast<Handle>(result);
+}
+
 Kind handleKind(Handle handle) {
     struct stat info;
     if (::fstat(fd(handle), &info) != 0) {

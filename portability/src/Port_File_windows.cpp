@@ -117,6 +117,7 @@ const char anchor = 0;
 Handle openFile(const std::string& name, OpenMode mode, bool binary) {
     std::wstring wide;
     if (!widen(name, wide) || wide.empty()) {
+        errno = EINVAL;
         return INVALID_HANDLE;
     }
     // Reading is always binary: the runtime's text mode ends a file at its first Ctrl-Z byte
@@ -172,6 +173,16 @@ bool writeFile(Handle handle, const void* data, std::size_t size) {
 
 bool closeFile(Handle handle) {
     return ::_close(fd(handle)) == 0;
+}
+
+Handle duplicateStandardInput() {
+    const int result = ::_dup(0);
+    if (result < 0) {
+        return INVALID_HANDLE;
+    }
+    // Bytes as stored, as for every file read.
+    ::_setmode(result, _O_BINARY);
+    return static_cast<Handle>(result);
 }
 
 Kind handleKind(Handle handle) {

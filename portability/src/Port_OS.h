@@ -6,7 +6,8 @@
 // platform's form (see nativeName): on POSIX the bytes go to the kernel unchanged; a Windows
 // implementation will turn them into wide characters there.
 //
-// No function here throws; each reports failure through its result.
+// No function here throws; each reports failure through its result, and the file functions
+// leave the system's error code in errno when they fail.
 #ifndef PORT_OS_H
 #define PORT_OS_H
 
@@ -49,6 +50,9 @@ std::int64_t readFile(Handle handle, void* buffer, std::size_t size);
 bool writeFile(Handle handle, const void* data, std::size_t size);
 // Closes the handle; false when the system reports an error (the handle is released anyway).
 bool closeFile(Handle handle);
+// A new handle on the process's standard input, not inherited by child processes (binary on
+// Windows); INVALID_HANDLE when standard input is closed.
+Handle duplicateStandardInput();
 // What an open handle denotes.
 Kind handleKind(Handle handle);
 // The size of an open regular file, or -1 when it is not known.
