@@ -28,9 +28,11 @@ foreach(installed lib/cmake/TesuUtilities/TesuUtilitiesConfig.cmake
     message(FATAL_ERROR "not installed: ${installed}")
   endif()
 endforeach()
-if(EXISTS ${prefix}/include/tesu/Tesu_FileListMember.h)
-  message(FATAL_ERROR "an internal header was installed: Tesu_FileListMember.h")
-endif()
+foreach(internal Tesu_FileListMember.h Tesu_ChecksumKernel.h Tesu_ChecksumScanner.h)
+  if(EXISTS ${prefix}/include/tesu/${internal})
+    message(FATAL_ERROR "an internal header was installed: ${internal}")
+  endif()
+endforeach()
 
 run_step("configuring the consumer" ${CMAKE_COMMAND} -S ${PROJECT_DIR} -B ${WORK_DIR}/build
          -G ${GENERATOR} -DCMAKE_PREFIX_PATH=${prefix} -DCMAKE_CXX_COMPILER=${CXX_COMPILER}
