@@ -440,6 +440,7 @@ std::vector<Port::StringBase<char>> Utilities::GetFileListFileStrings(const Port
 
     const bool windowsNt = Port_Env::IsNt();
     Port::StringBase<char> line;
+    Port::StringBase<char> joined;  // the directory part and the member, reused from line to line
     while (!stream->geteof()) {
         if (stream->readline(line) > 0) {
             const std::size_t comment = line.GetIndexOfFirstChar('#', '\0');
@@ -455,12 +456,16 @@ std::vector<Port::StringBase<char>> Utilities::GetFileListFileStrings(const Port
             continue;
         }
         FileListMember::NormaliseSeparators(line, windowsNt);
-        const Port::FileName member(directory + line);
-        if (Port::File::exist(member)) {
+        // The joined text is the file name's text (a FileName made of it gives it back
+        // unchanged), so it is tested as it stands; a FileName is made only for the warning.
+        joined.Assign(directory);
+        joined.Append(line);
+        if (Port::File::exist(joined)) {
             members.push_back(line);
         } else {
-            messageSource(__LINE__).issueWarning("Missing file list member %s\n",
-                                                 member.GetAbsolutePath(false).GetText());
+            messageSource(__LINE__).issueWarning(
+                "Missing file list member %s\n",
+                Port::FileName(joined).GetAbsolutePath(false).GetText());
         }
     }
 

@@ -225,12 +225,17 @@ bool StringBase<char>::Replace(const StringBase& from, const StringBase& to, Com
 }
 
 std::size_t StringBase<char>::ReplaceChars(char from, char to) {
+    // memchr skips the stretches without `from`, which are most of a text.
     std::size_t count = 0;
-    for (char& c : text_) {
-        if (c == from) {
-            c = to;
-            ++count;
+    char* next = text_.data();
+    char* const end = next + text_.size();
+    while (next != end) {
+        next = static_cast<char*>(std::memchr(next, from, static_cast<std::size_t>(end - next)));
+        if (next == nullptr) {
+            break;
         }
+        *next++ = to;
+        ++count;
     }
     return count;
 }
