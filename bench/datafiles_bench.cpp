@@ -1,22 +1,33 @@
-// Data files: checking a large checksummed file against the raw speed of reading it, its
-// memory, the CRC-32 against libdeflate and zlib called directly, and reading a long file
-// list. The data is generated in a temporary directory and removed at the end. Rates are
-// per processor second (kernel time included), so the load of other processes counts little.
+// Data files: checking a large checksummed file against the system's cksum on the same file
+// and against the floor of reading it and computing the CRC-32 of all its bytes; its memory;
+// the layer's CRC-32 against ISA-L, libdeflate and zlib called directly; reading a long file
+// list. The data is generated in a temporary directory and removed at the end. Times are
+// processor seconds (kernel time included; for cksum, those of the child process), so the
+// load of other processes counts little.
 //
 //   BM_FreadFile                   the file read with std::fread into a 1 MiB buffer.
-//   BM_ReadLinesOnly               its lines read through the layer, nothing more: the floor
-//                                  under the check, which reads the file this way.
+//   BM_ReadAndCrcFloor             read(2) into a 1 MiB buffer and the CRC-32 of every byte with
+//                                  the fastest library at hand: the floor under the check.
 //   BM_ValidateFileChecksum        the check; peak_MiB: the peak resident memory during the
 //                                  checks above the resident memory before them.
-//   BM_ValidateVersusFread         vs_fread: the check's speed over fread's (one fread pass
-//                                  and one check per iteration, timed side by side).
-//   BM_Crc32_*                     the CRC-32 of 64 MiB: the layer's, libdeflate's, zlib's;
-//                                  vs_libdeflate: the layer's speed over libdeflate's.
+//   BM_ValidateVersusCksum         per iteration one run of cksum on the file as a process, one
+//                                  check and one floor pass, side by side; vs_cksum: the check's
+//                                  time over cksum's; vs_floor: the check's time over the
+//                                  floor's; *_ms: the three times.
+//   BM_Crc32_*                     the CRC-32 of 64 MiB: the layer's, ISA-L's, libdeflate's,
+//                                  zlib's.
+//   BM_Crc32_PortVersusIsal        vs_isal: the layer's speed over crc32_gzip_refl's (called
+//                                  directly), timed side by side.
 //   BM_FileListFileStrings         a list of 10,000 existing members; per_member: the time
 //                                  per member.
-// Targets: the check at 40% of fread's speed or more and under 16 MiB above the baseline;
-// the layer's CRC-32 at 90% of libdeflate's or more.
+//   BM_StatPerMember               one stat(2) of each member's path: the floor under the list.
+// Targets: vs_cksum <= 0.8; peak_MiB < 16; vs_isal >= 0.9; per_member <= 1.5 us.
 #include <benchmark/benchmark.h>
+#include <fcntl.h>
+#include <spawn.h>
+#include <sys/resource.h>
+#include <sys/stat.h>
+#include <sys/wait.h>
 #include <time.h>
 #include <unistd.h>
 #include <zlib.h>
@@ -31,6 +42,9 @@
 #include <string>
 #include <vector>
 
+#if defined(TESU_BENCH_ISAL)
+#include <isa-l/crc.h>
+#endif
 #if defined(TESU_BENCH_LIBDEFLATE)
 #include <libdeflate.h>
 #endif
@@ -160,26 +174,6 @@ void BM_FreadFile(benchmark::State& state) {
     state.SetBytesProcessed(static_cast<std::int64_t>(total));
 }
 
-// Reading the same file's lines through the layer with nothing else done: the floor under
-// the check, which reads the file this way.
-void BM_ReadLinesOnly(benchmark::State& state) {
-    const Port::StringBase<char> path(ChecksummedFile());
-    const std::size_t size = fs::file_size(path.str());
-    Port::StringBase<char> line;
-    for (auto _ : state) {
-        Port::Stream* stream = Port::File::open(path, Port::File::READ, true);
-        if (stream == nullptr) {
-            state.SkipWithError("cannot open the file");
-            return;
-        }
-        while (!stream->geteof()) {
-            stream->readline(line);
-        }
-        Port::File::close(stream);
-    }
-    state.SetBytesProcessed(static_cast<std::int64_t>(size * state.iterations()));
-}
-
 void BM_ValidateFileChecksum(benchmark::State& state) {
     const Port::StringBase<char> path(ChecksummedFile());
     const std::size_t size = fs::file_size(path.str());
@@ -201,30 +195,126 @@ void BM_ValidateFileChecksum(benchmark::State& state) {
     }
 }
 
-// One fread pass and one check per iteration, their processor times taken side by side so
-// that the ratio is measured under the same conditions.
-void BM_ValidateVersusFread(benchmark::State& state) {
-    const std::string& path = ChecksummedFile();
-    std::vector<char> buffer(kMiB);
-    double freadSeconds = 0.0;
-    double validateSeconds = 0.0;
-    for (auto _ : state) {
-        const auto start = CpuSeconds();
-        std::FILE* in = std::fopen(path.c_str(), "rb");
-        while (in != nullptr && std::fread(buffer.data(), 1, buffer.size(), in) > 0) {
-        }
-        if (in != nullptr) {
-            std::fclose(in);
-        }
-        const auto middle = CpuSeconds();
-        bool verdict = false;
-        Tesu::Utilities::ValidateFileChecksum(Port::StringBase<char>(path), verdict);
-        const auto end = CpuSeconds();
-        freadSeconds += middle - start;
-        validateSeconds += end - middle;
-    }
-    state.counters["vs_fread"] = validateSeconds > 0.0 ? freadSeconds / validateSeconds : 0.0;
+// The CRC-32 of bytes with the fastest library at hand, called directly.
+std::uint32_t BestCrc32(std::uint32_t crc, const unsigned char* data, std::size_t length) {
+#if defined(TESU_BENCH_ISAL)
+    return crc32_gzip_refl(crc, data, length);
+#elif defined(TESU_BENCH_LIBDEFLATE)
+    return libdeflate_crc32(crc, data, length);
+#else
+    return Port::StringBase<char>::CRC32(crc, data, length);
+#endif
 }
+
+const char* BestCrc32Name() {
+#if defined(TESU_BENCH_ISAL)
+    return "isa-l";
+#elif defined(TESU_BENCH_LIBDEFLATE)
+    return "libdeflate";
+#else
+    return Port::StringBase<char>::CRC32Implementation();
+#endif
+}
+
+// The floor: read(2) the whole file into `buffer` and the CRC-32 of every byte. False when the
+// file does not open.
+bool ReadAndCrc(const std::string& path, std::vector<unsigned char>& buffer, std::uint32_t& crc) {
+    const int fd = ::open(path.c_str(), O_RDONLY);
+    if (fd < 0) {
+        return false;
+    }
+    crc = 0;
+    ssize_t got = 0;
+    while ((got = ::read(fd, buffer.data(), buffer.size())) > 0) {
+        crc = BestCrc32(crc, buffer.data(), static_cast<std::size_t>(got));
+    }
+    ::close(fd);
+    return got == 0;
+}
+
+void BM_ReadAndCrcFloor(benchmark::State& state) {
+    const std::string& path = ChecksummedFile();
+    const std::size_t size = fs::file_size(path);
+    std::vector<unsigned char> buffer(kMiB);
+    for (auto _ : state) {
+        std::uint32_t crc = 0;
+        if (!ReadAndCrc(path, buffer, crc)) {
+            state.SkipWithError("cannot read the file");
+            return;
+        }
+        benchmark::DoNotOptimize(crc);
+    }
+    state.SetBytesProcessed(static_cast<std::int64_t>(size * state.iterations()));
+    state.SetLabel(BestCrc32Name());
+}
+
+#if defined(TESU_CKSUM)
+// Runs cksum on `path`, its output thrown away; the processor seconds of the child, or a
+// negative value when it could not be run or failed.
+double CksumSeconds(const std::string& path) {
+    posix_spawn_file_actions_t actions;
+    posix_spawn_file_actions_init(&actions);
+    posix_spawn_file_actions_addopen(&actions, STDOUT_FILENO, "/dev/null", O_WRONLY, 0);
+    std::string program = TESU_CKSUM;
+    std::string file = path;
+    char* argv[] = {program.data(), file.data(), nullptr};
+    pid_t child = 0;
+    const int spawned = posix_spawn(&child, program.c_str(), &actions, nullptr, argv, environ);
+    posix_spawn_file_actions_destroy(&actions);
+    if (spawned != 0) {
+        return -1.0;
+    }
+    int status = 0;
+    rusage usage{};
+    if (wait4(child, &status, 0, &usage) != child || !WIFEXITED(status) ||
+        WEXITSTATUS(status) != 0) {
+        return -1.0;
+    }
+    auto seconds = [](const timeval& t) {
+        return static_cast<double>(t.tv_sec) + static_cast<double>(t.tv_usec) * 1e-6;
+    };
+    return seconds(usage.ru_utime) + seconds(usage.ru_stime);
+}
+
+// cksum as a process, the check and the floor, one of each per iteration, so that the ratios
+// are measured under the same conditions.
+void BM_ValidateVersusCksum(benchmark::State& state) {
+    const std::string& path = ChecksummedFile();
+    const Port::StringBase<char> name(path);
+    std::vector<unsigned char> buffer(kMiB);
+    double cksumSeconds = 0.0;
+    double validateSeconds = 0.0;
+    double floorSeconds = 0.0;
+    for (auto _ : state) {
+        const double cksum = CksumSeconds(path);
+        if (cksum < 0.0) {
+            state.SkipWithError("cksum did not run");
+            return;
+        }
+        cksumSeconds += cksum;
+        const double start = CpuSeconds();
+        bool verdict = false;
+        const unsigned int result = Tesu::Utilities::ValidateFileChecksum(name, verdict);
+        const double middle = CpuSeconds();
+        std::uint32_t crc = 0;
+        const bool read = ReadAndCrc(path, buffer, crc);
+        const double end = CpuSeconds();
+        benchmark::DoNotOptimize(crc);
+        if (result != 0 || !verdict || !read) {
+            state.SkipWithError("the generated file does not validate");
+            return;
+        }
+        validateSeconds += middle - start;
+        floorSeconds += end - middle;
+    }
+    const double n = static_cast<double>(state.iterations());
+    state.counters["vs_cksum"] = cksumSeconds > 0.0 ? validateSeconds / cksumSeconds : 0.0;
+    state.counters["vs_floor"] = floorSeconds > 0.0 ? validateSeconds / floorSeconds : 0.0;
+    state.counters["check_ms"] = validateSeconds * 1e3 / n;
+    state.counters["cksum_ms"] = cksumSeconds * 1e3 / n;
+    state.counters["floor_ms"] = floorSeconds * 1e3 / n;
+}
+#endif
 
 const std::vector<unsigned char>& CrcData() {
     static const std::vector<unsigned char> data = [] {
@@ -247,6 +337,34 @@ void BM_Crc32_Port(benchmark::State& state) {
     state.SetLabel(Port::StringBase<char>::CRC32Implementation());
 }
 
+#if defined(TESU_BENCH_ISAL)
+void BM_Crc32_Isal(benchmark::State& state) {
+    const auto& data = CrcData();
+    for (auto _ : state) {
+        benchmark::DoNotOptimize(crc32_gzip_refl(0, data.data(), data.size()));
+    }
+    state.SetBytesProcessed(static_cast<std::int64_t>(data.size() * state.iterations()));
+}
+
+// The layer's CRC-32 and ISA-L's over the same data, timed side by side.
+void BM_Crc32_PortVersusIsal(benchmark::State& state) {
+    const auto& data = CrcData();
+    double portSeconds = 0.0;
+    double isalSeconds = 0.0;
+    for (auto _ : state) {
+        const auto start = CpuSeconds();
+        benchmark::DoNotOptimize(Port::StringBase<char>::CRC32(0, data.data(), data.size()));
+        const auto middle = CpuSeconds();
+        benchmark::DoNotOptimize(crc32_gzip_refl(0, data.data(), data.size()));
+        const auto end = CpuSeconds();
+        portSeconds += middle - start;
+        isalSeconds += end - middle;
+    }
+    state.counters["vs_isal"] = portSeconds > 0.0 ? isalSeconds / portSeconds : 0.0;
+    state.SetLabel(Port::StringBase<char>::CRC32Implementation());
+}
+#endif
+
 #if defined(TESU_BENCH_LIBDEFLATE)
 void BM_Crc32_Libdeflate(benchmark::State& state) {
     const auto& data = CrcData();
@@ -254,23 +372,6 @@ void BM_Crc32_Libdeflate(benchmark::State& state) {
         benchmark::DoNotOptimize(libdeflate_crc32(0, data.data(), data.size()));
     }
     state.SetBytesProcessed(static_cast<std::int64_t>(data.size() * state.iterations()));
-}
-
-// The layer's CRC-32 and libdeflate's over the same data, timed side by side.
-void BM_Crc32_PortVersusLibdeflate(benchmark::State& state) {
-    const auto& data = CrcData();
-    double portSeconds = 0.0;
-    double libdeflateSeconds = 0.0;
-    for (auto _ : state) {
-        const auto start = CpuSeconds();
-        benchmark::DoNotOptimize(Port::StringBase<char>::CRC32(0, data.data(), data.size()));
-        const auto middle = CpuSeconds();
-        benchmark::DoNotOptimize(libdeflate_crc32(0, data.data(), data.size()));
-        const auto end = CpuSeconds();
-        portSeconds += middle - start;
-        libdeflateSeconds += end - middle;
-    }
-    state.counters["vs_libdeflate"] = portSeconds > 0.0 ? libdeflateSeconds / portSeconds : 0.0;
 }
 #endif
 
@@ -314,19 +415,48 @@ void BM_FileListFileStrings(benchmark::State& state) {
         kListMembers, benchmark::Counter::kIsIterationInvariantRate | benchmark::Counter::kInvert);
 }
 
+// One stat of each member of the list, by the path the list gives it: the floor under reading
+// the list, which asks the system about every member once.
+void BM_StatPerMember(benchmark::State& state) {
+    const fs::path directory = fs::path(FileList()).parent_path();
+    std::vector<std::string> paths;
+    for (int i = 0; i < kListMembers; ++i) {
+        paths.push_back(
+            (directory / ("group" + std::to_string(i % 10) + "/member" + std::to_string(i) + ".v"))
+                .string());
+    }
+    for (auto _ : state) {
+        for (const std::string& path : paths) {
+            struct stat info {};
+            if (::stat(path.c_str(), &info) != 0) {
+                state.SkipWithError("a member is missing");
+                return;
+            }
+        }
+    }
+    state.counters["per_member"] = benchmark::Counter(
+        kListMembers, benchmark::Counter::kIsIterationInvariantRate | benchmark::Counter::kInvert);
+}
+
 }  // namespace
 
 BENCHMARK(BM_FreadFile)->Unit(benchmark::kMillisecond)->MinTime(2.0);
-BENCHMARK(BM_ReadLinesOnly)->Unit(benchmark::kMillisecond)->MinTime(1.0);
+BENCHMARK(BM_ReadAndCrcFloor)->Unit(benchmark::kMillisecond)->MinTime(2.0);
 BENCHMARK(BM_ValidateFileChecksum)->Unit(benchmark::kMillisecond)->MinTime(2.0);
-BENCHMARK(BM_ValidateVersusFread)->Unit(benchmark::kMillisecond)->Iterations(3);
+#if defined(TESU_CKSUM)
+BENCHMARK(BM_ValidateVersusCksum)->Unit(benchmark::kMillisecond)->Iterations(10);
+#endif
 BENCHMARK(BM_Crc32_Port)->Unit(benchmark::kMillisecond);
+#if defined(TESU_BENCH_ISAL)
+BENCHMARK(BM_Crc32_Isal)->Unit(benchmark::kMillisecond);
+BENCHMARK(BM_Crc32_PortVersusIsal)->Unit(benchmark::kMillisecond)->Iterations(40);
+#endif
 #if defined(TESU_BENCH_LIBDEFLATE)
 BENCHMARK(BM_Crc32_Libdeflate)->Unit(benchmark::kMillisecond);
-BENCHMARK(BM_Crc32_PortVersusLibdeflate)->Unit(benchmark::kMillisecond)->Iterations(20);
 #endif
 BENCHMARK(BM_Crc32_Zlib)->Unit(benchmark::kMillisecond);
 BENCHMARK(BM_FileListFileStrings)->Unit(benchmark::kMillisecond);
+BENCHMARK(BM_StatPerMember)->Unit(benchmark::kMillisecond);
 
 int main(int argc, char** argv) {
     benchmark::Initialize(&argc, argv);

@@ -1,6 +1,5 @@
 #include "Tesu_Utilities.h"
 
-#include <algorithm>
 #include <cstdint>
 #include <cstring>
 #include <exception>
@@ -15,6 +14,7 @@
 #include "Port_PathList.h"
 #include "Port_String.h"
 #include "Port_Version.h"
+#include "Tesu_ChecksumScanner.h"
 #include "Tesu_DebugMessenger.h"
 #include "Tesu_FileListMember.h"
 
@@ -312,200 +312,25 @@ Port::StringBase<char> ChecksumText(std::uint32_t crc) {
     return text;
 }
 
-// The stored checksum text of a file, collected while its lines go by: the eight characters
-// that follow the first marker "# CRC:" and one skipped character, read from the file's
-// lines each followed by "\n". It may run over into later lines, and is shorter when the
-// file ends first. Also kept: where the marker stands and what follows it on its line.
-class StoredChecksum {
-  public:
-    // True once the marker has been seen.
-    bool Found() const { return found_; }
-    // Looks for the marker in a line that starts at byte `offset` of the file; when it is
-    // there, starts collecting from it.
-    void Search(const char* line, std::size_t length, std::uint64_t offset) {
-        const std::size_t marker = FindMarker(line, length);
-        if (marker != Port::NPOS) {
-            found_ = true;
-            offset_ = offset + marker;
-            const std::size_t fieldStart = marker + kMarkerLength;
-            const std::size_t fieldLength = std::min(length - fieldStart, kFieldLength);
-            field_.Append(line + fieldStart, fieldLength);
-            skip_ = marker + kSkipAfterMarker;
-            Collect(line, length);
-        }
-    }
-    // Takes what is still wanted from a line after the marker's own.
-    void Collect(const char* line, std::size_t length) {
-        if (wanted_ > 0) {
-            Take(line, length);
-            Take("\n", 1);
-        }
-    }
-    const Port::StringBase<char>& Text() const { return text_; }
-    const Port::StringBase<char>& Field() const { return field_; }
-    std::uint64_t Offset() const { return offset_; }
-
-  private:
-    static constexpr char kMarker[] = "# CRC:";
-    static constexpr std::size_t kMarkerLength = sizeof kMarker - 1;
-    // The marker and the separator after it.
-    static constexpr std::size_t kSkipAfterMarker = kMarkerLength + 1;
-    // The separator and the eight characters of the checksum.
-    static constexpr std::size_t kFieldLength = 9;
-
-    static std::size_t FindMarker(const char* line, std::size_t length) {
-        std::size_t at = 0;
-        while (length - at >= kMarkerLength) {
-            // Only where the whole marker fits.
-            const void* hash = std::memchr(line + at, '#', length - at - kMarkerLength + 1);
-            if (hash == nullptr) {
-                break;
-            }
-            at = static_cast<std::size_t>(static_cast<const char*>(hash) - line);
-            if (std::memcmp(line + at, kMarker, kMarkerLength) == 0) {
-                return at;
-            }
-            ++at;
-        }
-        return Port::NPOS;
-    }
-
-    void Take(const char* data, std::size_t length) {
-        const std::size_t skipped = skip_ < length ? skip_ : length;
-        skip_ -= skipped;
-        data += skipped;
-        length -= skipped;
-        const std::size_t taken = wanted_ < length ? wanted_ : length;
-        text_.Append(data, taken);
-        wanted_ -= taken;
-    }
-
-    bool found_ = false;
-    std::uint64_t offset_ = 0;
-    std::size_t skip_ = 0;
-    std::size_t wanted_ = 8;
-    Port::StringBase<char> text_;
-    Port::StringBase<char> field_;
-};
-
-// Follows a checksummed file line by line: the CRC-32 of the lines without "#", joined, and
-// the stored checksum text. Data lines are gathered into a bounded batch so that the CRC runs
-// over long stretches instead of line by line; a line as long as a batch goes to the CRC by
-// itself, so memory stays bounded.
-class LineScan {
-  public:
-    LineScan() : batch_(kBatchBytes) {}
-    LineScan(const LineScan&) = delete;
-    LineScan& operator=(const LineScan&) = delete;
-
-    // The next line of the file, without its line break; it starts at byte `offset`.
-    void Add(const char* line, std::size_t length, std::uint64_t offset) {
-        const bool dataLine = std::memchr(line, '#', length) == nullptr;
-        if (dataLine) {
-            if (length > kBatchBytes - used_) {
-                Flush();
-            }
-            if (length >= kBatchBytes) {
-                crc_ = Port::StringBase<char>::CRC32(crc_, line, length);
-            } else {
-                std::memcpy(batch_.data() + used_, line, length);
-                used_ += length;
-            }
-        }
-        if (stored_.Found()) {
-            stored_.Collect(line, length);
-        } else if (!dataLine) {
-            stored_.Search(line, length, offset);
-        }
-    }
-    // After the last line: the CRC of the data lines.
-    std::uint32_t Finish() {
-        Flush();
-        return crc_;
-    }
-    const StoredChecksum& Stored() const { return stored_; }
-
-  private:
-    static constexpr std::size_t kBatchBytes = 64 * 1024;
-
-    void Flush() {
-        crc_ = Port::StringBase<char>::CRC32(crc_, batch_.data(), used_);
-        used_ = 0;
-    }
-
-    std::uint32_t crc_ = 0;
-    StoredChecksum stored_;
-    std::vector<char> batch_;  // data lines, joined
-    std::size_t used_ = 0;     // bytes of the batch in use
-};
-
-// Hands every line of `stream` to `scan`, split exactly as Port::Stream::readline splits them
-// (at "\n", the "\r" of a "\r\n" end dropped, a last line without a line break kept as it
-// is, no line after a final line break), but a block at a time: a line that lies whole in a
-// block is handed over in place, without a copy; only a line that runs over the end of a block
-// is gathered in `carry`. Returns how the first line ends ("\n", "\r\n", or "" when no line
-// break comes).
-const char* ScanLines(Port::Stream& stream, LineScan& scan) {
-    const char* firstBreak = "";
-    std::string carry;
-    std::uint64_t blockStart = 0;  // offset of the current block in the file
-    std::uint64_t lineStart = 0;   // offset of the line being read
-    const char* block = nullptr;
-    for (std::size_t size = stream.readblock(block); size > 0;
-         blockStart += size, size = stream.readblock(block)) {
-        const char* next = block;
-        const char* const end = block + size;
-        while (next < end) {
-            const char* lineBreak = static_cast<const char*>(
-                std::memchr(next, '\n', static_cast<std::size_t>(end - next)));
-            if (lineBreak == nullptr) {
-                carry.append(next, static_cast<std::size_t>(end - next));
-                break;
-            }
-            bool crlf = false;
-            if (carry.empty()) {
-                const char* lineEnd = lineBreak;
-                if (lineEnd > next && lineEnd[-1] == '\r') {
-                    --lineEnd;
-                    crlf = true;
-                }
-                scan.Add(next, static_cast<std::size_t>(lineEnd - next), lineStart);
-            } else {
-                carry.append(next, static_cast<std::size_t>(lineBreak - next));
-                if (carry.back() == '\r') {
-                    carry.pop_back();
-                    crlf = true;
-                }
-                scan.Add(carry.data(), carry.size(), lineStart);
-                carry.clear();
-            }
-            if (*firstBreak == '\0') {
-                firstBreak = crlf ? "\r\n" : "\n";
-            }
-            next = lineBreak + 1;
-            lineStart = blockStart + static_cast<std::uint64_t>(next - block);
-        }
-    }
-    if (!carry.empty()) {
-        scan.Add(carry.data(), carry.size(), lineStart);
-    }
-    return firstBreak;
-}
-
-// Reads the rest of `stream` into `result`. The CRC and the stored text say nothing yet of
-// the file's verdict when a read failed; the caller decides what that means.
+// Reads the rest of `stream` into `result`, a block at a time, in one pass with fixed memory
+// (checksumscan::Scanner). The CRC and the stored text say nothing yet of the file's verdict
+// when a read failed; the caller decides what that means.
 void ScanStream(Port::Stream& stream, ChecksumScan& result) {
-    LineScan scan;
-    result.firstLineBreak = ScanLines(stream, scan);
-    result.crc = scan.Finish();
+    checksumscan::Scanner scanner;
+    const char* block = nullptr;
+    for (std::size_t size = stream.readblock(block); size > 0; size = stream.readblock(block)) {
+        scanner.Block(block, size);
+    }
+    scanner.Finish();
+    result.crc = scanner.Crc();
     result.checksum = ChecksumText(result.crc);
-    const StoredChecksum& stored = scan.Stored();
-    result.marked = stored.Found();
-    result.markerOffset = stored.Offset();
-    result.markerField = stored.Field();
-    result.stored = stored.Text();
+    result.marked = scanner.Marked();
+    result.markerOffset = scanner.MarkerOffset();
+    result.markerField = scanner.MarkerField();
+    result.stored = scanner.Stored();
     result.valid =
-        !stored.Found() || stored.Text().Compare(result.checksum, Port::COMPARE_NOCASE) == 0;
+        !result.marked || result.stored.Compare(result.checksum, Port::COMPARE_NOCASE) == 0;
+    result.firstLineBreak = scanner.FirstLineBreak();
     result.reason = stream.error();
 }
 
@@ -615,6 +440,7 @@ std::vector<Port::StringBase<char>> Utilities::GetFileListFileStrings(const Port
 
     const bool windowsNt = Port_Env::IsNt();
     Port::StringBase<char> line;
+    Port::StringBase<char> joined;  // the directory part and the member, reused from line to line
     while (!stream->geteof()) {
         if (stream->readline(line) > 0) {
             const std::size_t comment = line.GetIndexOfFirstChar('#', '\0');
@@ -630,12 +456,16 @@ std::vector<Port::StringBase<char>> Utilities::GetFileListFileStrings(const Port
             continue;
         }
         FileListMember::NormaliseSeparators(line, windowsNt);
-        const Port::FileName member(directory + line);
-        if (Port::File::exist(member)) {
+        // The joined text is the file name's text (a FileName made of it gives it back
+        // unchanged), so it is tested as it stands; a FileName is made only for the warning.
+        joined.Assign(directory);
+        joined.Append(line);
+        if (Port::File::exist(joined)) {
             members.push_back(line);
         } else {
-            messageSource(__LINE__).issueWarning("Missing file list member %s\n",
-                                                 member.GetAbsolutePath(false).GetText());
+            messageSource(__LINE__).issueWarning(
+                "Missing file list member %s\n",
+                Port::FileName(joined).GetAbsolutePath(false).GetText());
         }
     }
 

@@ -125,8 +125,8 @@ class TESU_API Utilities {
     // `verdict` true when it holds no "# CRC:" or the stored text matches (letter case
     // ignored), false otherwise; returns 1 with `verdict` false when it cannot be opened
     // (error "Could not open <name>") or closed (error "Could not close <name>"), naming the
-    // file as passed. The file is read in one pass; memory use is bounded by its longest
-    // line, not by its size.
+    // file as passed. The file is read in one pass with a fixed amount of memory (well under
+    // 1 MiB), whatever its size and the length of its lines.
     static unsigned int ValidateFileChecksum(const Port::StringBase<char>& fileName, bool& verdict);
     // Reads the file `fileName` as ValidateFileChecksum does and fills `scan` (every field set
     // anew), issuing no message; memory use is bounded as there. Returns 0 when the file was

@@ -2,9 +2,11 @@
 // their own "# CRC:" line.
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cerrno>
 #include <cstring>
 #include <filesystem>
+#include <random>
 #include <string>
 #include <vector>
 
@@ -254,6 +256,13 @@ TEST(ValidateFileChecksum, LongLinesAmongShortOnes) {
     ExpectValid(dir, "x" + longComment + " # CRC: " + sum + "\n" + body,
                 "marker at the end of a long comment line");
     ExpectInvalid(dir, "# CRC: " + sum + "\n" + body + longData + "\n", "long data line added");
+    // A CR-LF data line whose "\r" falls on every byte around 32 KiB, where the scanner's
+    // buffer of data-line bytes fills and goes to the CRC while the line is still open.
+    for (std::size_t length = 32 * 1024 - 70; length <= 32 * 1024 + 70; ++length) {
+        const std::string line(length, 'x');
+        ExpectValid(dir, line + "\r\ntail\r\n# CRC: " + Sum(line + "\ntail\n") + "\r\n",
+                    "CR-LF line of " + std::to_string(length));
+    }
 }
 
 TEST(ValidateFileChecksum, FilesWithNothingToSum) {
@@ -354,6 +363,105 @@ TEST(ScanChecksummedFile, TellsWhereTheChecksumLineStandsAndHowLinesEnd) {
         EXPECT_EQ(scan.markerOffset, streamed.markerOffset) << what;
         EXPECT_EQ(scan.stored, streamed.stored) << what;
         EXPECT_TRUE(Port::File::close(stream));
+    }
+}
+
+// What a scan must find in `bytes`, worked out from the file's lines as the layer's line reader
+// splits them, one line at a time.
+Tesu::ChecksumScan ModelScan(const std::string& bytes) {
+    Tesu::ChecksumScan model;
+    std::string content;  // the lines, each followed by "\n"
+    std::string joined;   // the lines without "#"
+    for (std::size_t at = 0; at < bytes.size();) {
+        std::size_t end = bytes.find('\n', at);
+        const bool broken = end != std::string::npos;
+        end = broken ? end : bytes.size();
+        std::string line = bytes.substr(at, end - at);
+        const bool crlf = broken && !line.empty() && line.back() == '\r';
+        if (crlf) {
+            line.pop_back();
+        }
+        if (broken && model.firstLineBreak.IsEmpty()) {
+            model.firstLineBreak = crlf ? "\r\n" : "\n";
+        }
+        content += line + "\n";
+        if (line.find('#') == std::string::npos) {
+            joined += line;
+        }
+        at = end + 1;
+    }
+    model.crc = Port::StringBase<char>(joined).CRC32();
+    model.checksum.Format("%8x", static_cast<unsigned int>(model.crc));
+    const std::size_t marker = content.find("# CRC:");
+    model.marked = marker != std::string::npos;
+    if (model.marked) {
+        model.markerOffset = bytes.find("# CRC:");
+        const std::size_t field = marker + 6;
+        model.markerField =
+            content.substr(field, std::min<std::size_t>(9, content.find('\n', field) - field));
+        model.stored = marker + 7 <= content.size() ? content.substr(marker + 7, 8) : "";
+        model.valid = model.stored == model.checksum;
+    }
+    return model;
+}
+
+// Random files, small ones and ones whose interesting bytes straddle the end of the reader's
+// first block (256 KiB), built from line breaks of both kinds, lone "\r", "#", markers whole
+// and cut, stamps and lines longer than the scanner's buffers; every field of the scan must be
+// the model's.
+TEST(ScanChecksummedFile, AgreesWithTheLineModelOnRandomFiles) {
+    const std::string pieces[] = {"a",          "data",   "\r",      "\n",      "\r\n", "#",
+                                  " ",          "# CRC:", "# CRC: ", "# CR",    "C:",   "\n\n",
+                                  "0123abcd\n", "\r\r\n", "ab#cd",   "\n# CRC:"};
+    std::mt19937 random(20261207);
+    tesutest::TempDir dir;
+    for (int round = 0; round < 160; ++round) {
+        std::string bytes;
+        const int kind = round % 4;
+        // Lines of any length with either line break, up to a few bytes before the block's
+        // end or to some small size.
+        const std::size_t edge = kind >= 2 ? 256 * 1024 - random() % 80 : random() % 2000;
+        while (bytes.size() < edge) {
+            bytes += std::string(std::min<std::size_t>(random() % 100, edge - bytes.size()), 'l');
+            bytes += random() % 2 == 0 ? "\n" : "\r\n";
+        }
+        const int count = 1 + static_cast<int>(random() % 40);
+        for (int i = 0; i < count; ++i) {
+            if (random() % 16 == 0) {
+                // A run longer than the scanner's buffer, with or without a "#" in it.
+                std::string run(20 * 1024 + random() % (80 * 1024), 'r');
+                if (random() % 2 == 0) {
+                    run[random() % run.size()] = '#';
+                }
+                bytes += run;
+            } else {
+                bytes += pieces[random() % (sizeof pieces / sizeof pieces[0])];
+            }
+        }
+        if (kind == 1 || kind == 3) {
+            // Stamped with the file's own checksum at a random place.
+            const Tesu::ChecksumScan plain = ModelScan(bytes);
+            if (!plain.marked) {
+                const std::size_t at = random() % (bytes.size() + 1);
+                bytes.insert(at, "\n# CRC: " + plain.checksum.str() + "\n");
+            }
+        }
+        const Tesu::ChecksumScan model = ModelScan(bytes);
+        const std::string path = dir.write("random.txt", bytes);
+        Tesu::ChecksumScan scan;
+        ASSERT_EQ(0u, Utilities::ScanChecksummedFile(Port::StringBase<char>(path), scan));
+        const std::string what = "round " + std::to_string(round);
+        EXPECT_EQ(model.crc, scan.crc) << what;
+        EXPECT_EQ(model.checksum, scan.checksum) << what;
+        EXPECT_EQ(model.marked, scan.marked) << what;
+        EXPECT_EQ(model.markerOffset, scan.markerOffset) << what;
+        EXPECT_EQ(model.markerField, scan.markerField) << what;
+        EXPECT_EQ(model.stored, scan.stored) << what;
+        EXPECT_EQ(model.valid, scan.valid) << what;
+        EXPECT_EQ(model.firstLineBreak, scan.firstLineBreak) << what;
+        bool verdict = !model.valid;
+        EXPECT_EQ(0u, Utilities::ValidateFileChecksum(Port::StringBase<char>(path), verdict));
+        EXPECT_EQ(model.valid, verdict) << what;
     }
 }
 

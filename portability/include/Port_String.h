@@ -146,7 +146,7 @@ class PORT_API StringBase<char> {
     // Continues a CRC-32 over more bytes: start from 0 and pass each result back in, and the
     // final value equals the CRC-32 of all the bytes in one piece.
     static std::uint32_t CRC32(std::uint32_t crc, const void* data, std::size_t length);
-    // Name of the CRC-32 implementation compiled in ("libdeflate" or "zlib").
+    // Name of the CRC-32 implementation compiled in ("isa-l", "libdeflate" or "zlib").
     static const char* CRC32Implementation();
 
     // --- formatting ----------------------------------------------------------------------

@@ -52,7 +52,18 @@ Result failWith(StringBase<char> reason, Result result) {
     return result;
 }
 
+// True when `text` can go to the system as it stands: no NUL byte, and only the platform's
+// separator.
+bool alreadyNative(const std::string& text) {
+    constexpr char kOtherSeparator = os::kPathSeparator == '/' ? '\\' : '/';
+    return text.find('\0') == std::string::npos && text.find(kOtherSeparator) == std::string::npos;
+}
+
 os::Kind kindOf(const StringBase<char>& name) {
+    // Most names are native already: they are then passed without a copy.
+    if (alreadyNative(name.str())) {
+        return os::nameKind(name.str());
+    }
     std::string native;
     return systemName(name, native) ? os::nameKind(native) : os::Kind::NONE;
 }

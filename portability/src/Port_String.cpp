@@ -8,12 +8,14 @@
 #include <cstring>
 #include <utility>
 
-#if defined(PORT_CRC32_LIBDEFLATE)
+#if defined(PORT_CRC32_ISAL)
+#include <isa-l/crc.h>
+#elif defined(PORT_CRC32_LIBDEFLATE)
 #include <libdeflate.h>
 #elif defined(PORT_CRC32_ZLIB)
 #include <zlib.h>
 #else
-#error "Define PORT_CRC32_LIBDEFLATE or PORT_CRC32_ZLIB to choose the CRC-32 implementation"
+#error "Define PORT_CRC32_ISAL, PORT_CRC32_LIBDEFLATE or PORT_CRC32_ZLIB to choose the CRC-32"
 #endif
 
 namespace Port {
@@ -223,12 +225,17 @@ bool StringBase<char>::Replace(const StringBase& from, const StringBase& to, Com
 }
 
 std::size_t StringBase<char>::ReplaceChars(char from, char to) {
+    // memchr skips the stretches without `from`, which are most of a text.
     std::size_t count = 0;
-    for (char& c : text_) {
-        if (c == from) {
-            c = to;
-            ++count;
+    char* next = text_.data();
+    char* const end = next + text_.size();
+    while (next != end) {
+        next = static_cast<char*>(std::memchr(next, from, static_cast<std::size_t>(end - next)));
+        if (next == nullptr) {
+            break;
         }
+        *next++ = to;
+        ++count;
     }
     return count;
 }
@@ -355,18 +362,18 @@ bool StringBase<char>::GetINT32(const Port_Range& range, std::int32_t& value) co
 }
 
 std::uint32_t StringBase<char>::CRC32() const {
-#if defined(PORT_CRC32_LIBDEFLATE)
-    return libdeflate_crc32(0, text_.data(), text_.size());
-#else
     return CRC32(0, text_.data(), text_.size());
-#endif
 }
 
+// All three libraries take and return the running value without its final inversion (0 to
+// start), so a CRC continues from where the last piece left it.
 std::uint32_t StringBase<char>::CRC32(std::uint32_t crc, const void* data, std::size_t length) {
     if (data == nullptr || length == 0) {
         return crc;
     }
-#if defined(PORT_CRC32_LIBDEFLATE)
+#if defined(PORT_CRC32_ISAL)
+    return crc32_gzip_refl(crc, static_cast<const unsigned char*>(data), length);
+#elif defined(PORT_CRC32_LIBDEFLATE)
     return libdeflate_crc32(crc, data, length);
 #else
     // zlib counts in unsigned int: feed it pieces of at most 1 GiB.
@@ -384,7 +391,9 @@ std::uint32_t StringBase<char>::CRC32(std::uint32_t crc, const void* data, std::
 }
 
 const char* StringBase<char>::CRC32Implementation() {
-#if defined(PORT_CRC32_LIBDEFLATE)
+#if defined(PORT_CRC32_ISAL)
+    return "isa-l";
+#elif defined(PORT_CRC32_LIBDEFLATE)
     return "libdeflate";
 #else
     return "zlib";

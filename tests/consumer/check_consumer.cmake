@@ -39,7 +39,7 @@ foreach(installed ${LIBDIR}/pkgconfig/tesu-utilities.pc share/doc/TesuUtilities/
     message(FATAL_ERROR "not installed: ${installed}")
   endif()
 endforeach()
-foreach(internal Tesu_FileListMember.h Tesu_Jni.h)
+foreach(internal Tesu_FileListMember.h Tesu_Jni.h Tesu_ChecksumKernel.h Tesu_ChecksumScanner.h)
   if(EXISTS ${prefix}/include/tesu/${internal})
     message(FATAL_ERROR "an internal header was installed: ${internal}")
   endif()
